@@ -1,0 +1,35 @@
+#pragma once
+
+#include <filesystem>
+#include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+/// One `KEY=value` line of a settings file.
+struct Setting {
+  std::string value;  ///< With quotes and escapes taken away.
+  int line = 0;       ///< Where it stands, counted from 1.
+};
+
+/// A settings file, in the syntax of os-release(5): `KEY=value` lines, blank lines, lines that
+/// start with `#`; a value may stand in single quotes, or in double quotes with backslash escapes.
+/// Keys may hold points as well. A later line for a key counts before an earlier one.
+struct SettingsFile {
+  /// One thing that could not be read.
+  struct Fault {
+    int line = 0;  ///< 0 when it is the file as a whole.
+    std::string what;
+  };
+
+  std::map<std::string, Setting> settings;
+  std::vector<Fault> faults;
+
+  /// Reads the file at `path`. Empty when there is no such file; one that is there and cannot be
+  /// read gives a fault and no settings, a line that cannot be read gives a fault and is passed
+  /// over. From any thread.
+  static std::optional<SettingsFile> read(const std::filesystem::path& path);
+
+  /// As `read`, from a text.
+  static SettingsFile parse(const std::string& text);
+};

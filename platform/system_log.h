@@ -1,0 +1,13 @@
+#pragma once
+
+#include <string>
+
+/// Where messages of one part of the system are filed in the system log.
+struct LogContext {
+  std::string subsystem;  ///< Reverse-DNS name of the product.
+  std::string category;   ///< The part of the product.
+};
+
+/// Writes one message to the system log, at the level of errors. From any thread; a message that
+/// cannot be written is dropped, because there is nowhere else to say so.
+void logSystemError(const std::string& message);

@@ -1,0 +1,28 @@
+#pragma once
+
+#include <string>
+
+/// What the device says of its radio, its build and its processes. The answers of the device
+/// profile do not change while the process runs; all of these may be asked from any thread.
+
+/// The type of the device's cellular radio; 0 when it has none.
+int radioType();
+
+/// The device's product code.
+int productCode();
+
+/// The vendor of the device's baseband radio.
+int radioVendor();
+
+/// Whether the radio's diagnostic interface supports QDSS tracing.
+bool radioDiagSupportsQdss();
+
+/// Whether the operating system is an internal build.
+bool isInternalBuild();
+
+/// Whether the operating system is a carrier build.
+bool isCarrierBuild();
+
+/// Whether a process runs whose command name, or the last component of whose executable, is exactly
+/// `name`. The process table is read at each call; see proc(5).
+bool processRunning(const std::string& name);
