@@ -1,6 +1,5 @@
 #include "platform/linux/device_profile.h"
 
-
 #include <charconv>
 #include <optional>
 

@@ -15,7 +15,7 @@ class PlainNode : public CommandBase {
   static std::shared_ptr<PlainNode> create(const std::string& nodeName,
                                            const std::weak_ptr<CommandBase>& parentNode,
                                            Fill contents = nullptr) {
-    const std::shared_ptr<PlainNode> node(new PlainNode(nodeName, parentNode, std::move(contents)));
+    std::shared_ptr<PlainNode> node(new PlainNode(nodeName, parentNode, std::move(contents)));
     node->init();
     return node;
   }

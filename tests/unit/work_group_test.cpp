@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <optional>
 #include <thread>
 
@@ -13,20 +12,18 @@ TEST(WorkGroup, IsEnteredOnceForEachLiveCopyOfAMembership) {
   EXPECT_TRUE(group.waitFor(0ns));
   std::optional<WorkGroup::Membership> first(group);
   auto second = std::make_optional(*first);
-  const auto moved = std::make_optional(std::move(*second));
+  auto moved = std::make_optional(std::move(*second));
   first.reset();
   second.reset();
   EXPECT_FALSE(group.waitFor(0ns));
+  moved.reset();
+  EXPECT_TRUE(group.waitFor(0ns));
 }
 
 TEST(WorkGroup, ReleasesItsWaiterWhenTheLastMembershipGoes) {
   const auto group = WorkGroup::create();
   bool done = false;
-  std::function<void()> work = [&done, membership = WorkGroup::Membership(group)] { done = true; };
-  std::thread worker([copy = std::exchange(work, nullptr)]() mutable {
-    copy();
-    copy = nullptr;
-  });
+  std::thread worker([&done, membership = WorkGroup::Membership(group)] { done = true; });
   group.wait();
   EXPECT_TRUE(done);
   worker.join();

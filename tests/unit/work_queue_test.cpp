@@ -13,7 +13,7 @@ TEST(WorkQueue, RunsEverythingInOrderBeforeItsLastHandleGoes) {
     std::optional<WorkQueue> queue("test");
     queue->submit([&] { gate.get_future().wait(); });
     for (const char letter : {'a', 'b', 'c'}) {
-      queue->submit([&log, letter, copy = *queue] { log += letter; });
+      queue->submit([&log, letter] { log += letter; });
     }
     gate.set_value();
     const auto last = *queue;
