@@ -1,6 +1,7 @@
 #include "simulator/helper_service.h"
 
 #include "platform/linux/bus_dictionary.h"
+#include "simulator/request_text.h"
 
 #include <cerrno>
 #include <string>
@@ -11,7 +12,7 @@ namespace simulator {
 namespace {
 
 constexpr Service::Identity kIdentity = {"org.vell.Helper1", "/org/vell/Helper1",
-                                         "org.vell.Helper1", false};
+                                         "org.vell.Helper1", "Perform", false};
 
 }  // namespace
 
@@ -26,7 +27,7 @@ bool HelperService::connect() {
                               SD_BUS_RESULT("i", status, "v", reply), perform, 0),
       SD_BUS_VTABLE_END,
   };
-  return service.connect(kVtable, this);
+  return service.connect(kVtable, perform, this);
 }
 
 int HelperService::perform(sd_bus_message* call, void* userdata, sd_bus_error* /*error*/) {

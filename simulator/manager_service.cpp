@@ -3,6 +3,7 @@
 #include "platform/linux/bus_dictionary.h"
 #include "platform/manager_names.h"
 #include "simulator/complaint.h"
+#include "simulator/request_text.h"
 
 #include <sys/epoll.h>
 #include <sys/stat.h>
@@ -18,7 +19,7 @@ namespace simulator {
 namespace {
 
 constexpr Service::Identity kIdentity = {"org.vell.Manager1", "/org/vell/Manager1",
-                                         "org.vell.Manager1", true};
+                                         "org.vell.Manager1", "PerformCommand", true};
 
 }  // namespace
 
@@ -44,7 +45,7 @@ bool ManagerService::connect() {
       SD_BUS_PROPERTY("ServerState", isString ? "s" : "x", getServerState, 0, 0),
       SD_BUS_VTABLE_END,
   }};
-  return service.connect(vtable.data(), this) && takeControl();
+  return service.connect(vtable.data(), performCommand, this) && takeControl();
 }
 
 int ManagerService::openClient(sd_bus_message* call, void* userdata, sd_bus_error* /*error*/) {

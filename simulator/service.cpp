@@ -23,10 +23,14 @@ Service::Service(const Identity& ownIdentity, std::filesystem::path deviceRoot,
                  const RequestLog& log)
     : identity(ownIdentity), root(std::move(deviceRoot)), requests(log) {}
 
-bool Service::connect(const sd_bus_vtable* vtable, void* userdata) {
+bool Service::connect(const sd_bus_vtable* vtable, sd_bus_message_handler_t handler,
+                      void* userdata) {
+  requestHandler = handler;
+  handlersData = userdata;
   sd_event* newLoop = nullptr;
   sd_bus* newBus = nullptr;
-  sd_bus_slot* newSlot = nullptr;
+  sd_bus_slot* newTable = nullptr;
+  sd_bus_slot* newAhead = nullptr;
   int result = sd_event_new(&newLoop);
   loop.reset(newLoop);
   if (result >= 0) {
@@ -37,9 +41,13 @@ bool Service::connect(const sd_bus_vtable* vtable, void* userdata) {
     result = sd_bus_attach_event(newBus, newLoop, SD_EVENT_PRIORITY_NORMAL);
   }
   if (result >= 0) {
-    result = sd_bus_add_object_vtable(newBus, &newSlot, identity.path, identity.interface, vtable,
+    result = sd_bus_add_object_vtable(newBus, &newTable, identity.path, identity.interface, vtable,
                                       userdata);
-    slot.reset(newSlot);
+    table.reset(newTable);
+  }
+  if (result >= 0) {
+    result = sd_bus_add_object(newBus, &newAhead, identity.path, requestArrived, this);
+    ahead.reset(newAhead);
   }
   if (result >= 0) {
     result = sd_bus_set_exit_on_disconnect(newBus, 1);
@@ -51,6 +59,15 @@ bool Service::connect(const sd_bus_vtable* vtable, void* userdata) {
     complain(std::string("cannot serve ") + identity.name + ": " + std::strerror(-result));
   }
   return result >= 0;
+}
+
+/// Comes before the table, whose methods cannot reply with another signature than their own.
+int Service::requestArrived(sd_bus_message* call, void* userdata, sd_bus_error* error) {
+  const auto& service = *static_cast<Service*>(userdata);
+  const auto& own = service.identity;
+  return sd_bus_message_is_method_call(call, own.interface, own.method) > 0
+             ? service.requestHandler(call, service.handlersData, error)
+             : 0;
 }
 
 int Service::give(sd_bus_message* call, Answer answer, const std::string& about) {

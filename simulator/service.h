@@ -37,15 +37,17 @@ class Service {
     const char* name;
     const char* path;
     const char* interface;
+    const char* method;       ///< The one that carries a request.
     bool repliesWithMessage;  ///< Whether a message comes between the status and the reply.
   };
 
   /// Serves the device at `deviceRoot`; `log` must outlive the service.
   Service(const Identity& ownIdentity, std::filesystem::path deviceRoot, const RequestLog& log);
 
-  /// Connects to the system bus, serves `vtable` with `userdata`, and owns the name. Complains and
-  /// returns false when one of these is not possible.
-  bool connect(const sd_bus_vtable* vtable, void* userdata);
+  /// Connects to the system bus, serves `vtable`, in which `handler` stands for the request method,
+  /// with `userdata`, and owns the name. Complains and returns false when one of these is not
+  /// possible.
+  bool connect(const sd_bus_vtable* vtable, sd_bus_message_handler_t handler, void* userdata);
 
   [[nodiscard]] sd_bus* connection() const { return bus.get(); }
   [[nodiscard]] sd_event* eventLoop() const { return loop.get(); }
@@ -67,6 +69,7 @@ class Service {
     EventSourcePtr timer;
   };
 
+  static int requestArrived(sd_bus_message* call, void* userdata, sd_bus_error* error);
   static int timerFired(sd_event_source* source, std::uint64_t time, void* userdata);
   int carryOut(sd_bus_message* call, Answer answer, const std::string& about);
   int reply(sd_bus_message* call, const Answer& answer) const;
@@ -76,7 +79,10 @@ class Service {
   const RequestLog& requests;
   EventLoopPtr loop;
   BusPtr bus;
-  BusSlotPtr slot;
+  BusSlotPtr table;
+  BusSlotPtr ahead;
+  sd_bus_message_handler_t requestHandler = nullptr;
+  void* handlersData = nullptr;
   std::list<Pending> held;  ///< Requests that wait for their delay to pass.
 };
 
