@@ -51,30 +51,6 @@ std::string_view variantContents(sd_bus_message* message) {
   return contents;
 }
 
-bool readValue(sd_bus_message* message, MessageDict::Value& value) {
-  const auto contents = variantContents(message);
-  if (contents == "s") {
-    const char* text = nullptr;
-    const bool read = sd_bus_message_read(message, "v", "s", &text) > 0;
-    value = std::string(read ? text : "");
-    return read;
-  }
-  if (contents == "x") {
-    std::int64_t number = 0;
-    const bool read = sd_bus_message_read(message, "v", "x", &number) > 0;
-    value = number;
-    return read;
-  }
-  if (contents == "b") {
-    int flag = 0;
-    const bool read = sd_bus_message_read(message, "v", "b", &flag) > 0;
-    value = flag != 0;
-    return read;
-  }
-  value = MessageDict::OtherType{};
-  return sd_bus_message_skip(message, "v") > 0;
-}
-
 /// Reads one entry; `end` tells that there was none left.
 bool readEntry(sd_bus_message* message, MessageDict& dict, bool& end) {
   const int entered = sd_bus_message_enter_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv");
@@ -114,6 +90,30 @@ bool appendPayload(sd_bus_message* message, const MessageDict& dict) {
   }
   return openVariant(message, "a{sv}") && appendDictionary(message, dict) &&
          closeContainer(message);
+}
+
+bool readValue(sd_bus_message* message, MessageDict::Value& value) {
+  const auto contents = variantContents(message);
+  if (contents == "s") {
+    const char* text = nullptr;
+    const bool read = sd_bus_message_read(message, "v", "s", &text) > 0;
+    value = std::string(read ? text : "");
+    return read;
+  }
+  if (contents == "x") {
+    std::int64_t number = 0;
+    const bool read = sd_bus_message_read(message, "v", "x", &number) > 0;
+    value = number;
+    return read;
+  }
+  if (contents == "b") {
+    int flag = 0;
+    const bool read = sd_bus_message_read(message, "v", "b", &flag) > 0;
+    value = flag != 0;
+    return read;
+  }
+  value = MessageDict::OtherType{};
+  return sd_bus_message_skip(message, "v") > 0;
 }
 
 bool readDictionary(sd_bus_message* message, MessageDict& dict) {

@@ -19,5 +19,8 @@ bool readDictionary(sd_bus_message* message, MessageDict& dict);
 /// Reads a variant: its dictionary when it holds an `a{sv}`, else `notADictionary`.
 bool readPayload(sd_bus_message* message, MessageDict& dict);
 
+/// Reads a variant as one value of a dictionary.
+bool readValue(sd_bus_message* message, MessageDict::Value& value);
+
 /// Appends one text as an `s`, made valid as in `appendDictionary`.
 bool appendText(sd_bus_message* message, const std::string& text);

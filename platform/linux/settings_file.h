@@ -33,3 +33,7 @@ struct SettingsFile {
   /// As `read`, from a text.
   static SettingsFile parse(const std::string& text);
 };
+
+/// Says each of `faults` in the system log, with file and line. From any thread.
+void reportFaults(const std::filesystem::path& path,
+                  const std::vector<SettingsFile::Fault>& faults);

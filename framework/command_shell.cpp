@@ -1,0 +1,179 @@
+#include "framework/command_shell.h"
+
+#include "framework/terminal_colour.h"
+
+#include <algorithm>
+#include <iostream>
+#include <sstream>
+#include <utility>
+
+namespace {
+
+std::list<std::string> splitAtWhiteSpace(const std::string& line) {
+  std::list<std::string> words;
+  std::istringstream stream(line);
+  for (std::string word; stream >> word;) {
+    words.push_back(word);
+  }
+  return words;
+}
+
+}  // namespace
+
+CommandShell::~CommandShell() = default;
+
+std::list<std::string> CommandShell::convertCmdArgsToList(int count, char* const* words) {
+  return count < 1 ? std::list<std::string>() : std::list<std::string>(words, words + count);
+}
+
+bool CommandShell::run(std::list<std::string> words) {
+  rootNode = createRootCommand();
+  if (!rootNode) {
+    return false;
+  }
+  currentNode = rootNode;
+  if (!words.empty()) {
+    words.pop_front();
+  }
+  if (words.empty()) {
+    promptNode = rootNode;
+    return readInteractively();
+  }
+  return executeGroups(splitCommandGroups(words)) != GroupEnd::failed;
+}
+
+bool CommandShell::readInteractively() {
+  while (true) {
+    // The read flushes the prompt: standard input is tied to standard output.
+    std::cout << "(" << promptNode->getHierarchy() << ")>> ";
+    std::string line;
+    if (!std::getline(std::cin, line)) {
+      return false;
+    }
+    if (executeGroups(splitCommandGroups(splitAtWhiteSpace(line))) == GroupEnd::leave) {
+      return true;
+    }
+  }
+}
+
+std::vector<std::list<std::string>> CommandShell::splitCommandGroups(
+    const std::list<std::string>& words) {
+  std::vector<std::list<std::string>> groups;
+  std::list<std::string> group;
+  const auto closeGroup = [&] {
+    if (!group.empty()) {
+      groups.push_back(std::exchange(group, {}));
+    }
+  };
+  for (const auto& word : words) {
+    if (word == "--") {
+      closeGroup();
+    } else {
+      group.push_back(word);
+    }
+  }
+  closeGroup();
+  return groups;
+}
+
+CommandShell::GroupEnd CommandShell::executeGroups(
+    const std::vector<std::list<std::string>>& groups) {
+  for (const auto& group : groups) {
+    const auto end = executeGroup(group);
+    currentNode = promptNode ? promptNode : rootNode;
+    if (end != GroupEnd::succeeded) {
+      return end;
+    }
+  }
+  return GroupEnd::succeeded;
+}
+
+CommandShell::GroupEnd CommandShell::executeGroup(std::list<std::string> words) {
+  const auto endWith = [](bool result) { return result ? GroupEnd::succeeded : GroupEnd::failed; };
+  const bool oneWord = words.size() == 1;
+  while (!words.empty()) {
+    const auto word = std::move(words.front());
+    words.pop_front();
+    const bool lastWord = words.empty();
+    if (word == "cd") {
+      return endWith(changeNode(words));
+    }
+    if (currentNode->isValidCommand(word)) {
+      return endWith(runHandler(word, std::move(words)));
+    }
+    if (currentNode->isValidSubCommand(word)) {
+      if (!enterSubCommand(word)) {
+        return GroupEnd::failed;
+      }
+      if (lastWord) {
+        currentNode->displayHelp();
+        return GroupEnd::failed;
+      }
+      continue;
+    }
+    if (word == "help" && lastWord) {
+      currentNode->displayHelp();
+      return GroupEnd::succeeded;
+    }
+    if (word == "back" && oneWord) {
+      goBack();
+      return GroupEnd::succeeded;
+    }
+    if ((word == "quit" || word == "exit") && oneWord) {
+      return GroupEnd::leave;
+    }
+    showInvalidWord(word);
+    return GroupEnd::failed;
+  }
+  return GroupEnd::succeeded;
+}
+
+bool CommandShell::runHandler(const std::string& word, std::list<std::string> args) {
+  return currentNode->isAllowed(word) && currentNode->execCommand(word, std::move(args));
+}
+
+bool CommandShell::enterSubCommand(const std::string& word) {
+  if (!currentNode->isAllowed(word)) {
+    return false;
+  }
+  currentNode = currentNode->getSubCommandObj(word);
+  return true;
+}
+
+bool CommandShell::changeNode(const std::list<std::string>& operands) {
+  if (operands.size() != 1) {
+    currentNode->displayHelp();
+    return false;
+  }
+  auto path = operands.front();
+  std::replace(path.begin(), path.end(), '/', ' ');
+  for (const auto& step : splitAtWhiteSpace(path)) {
+    if (currentNode->isValidSubCommand(step)) {
+      currentNode = currentNode->getSubCommandObj(step);
+    } else if (step == "..") {
+      if (const auto parent = currentNode->getParent().lock()) {
+        currentNode = parent;
+      }
+    } else {
+      currentNode->displayHelp();
+      return false;
+    }
+  }
+  if (promptNode) {
+    promptNode = currentNode;
+  }
+  return true;
+}
+
+void CommandShell::goBack() {
+  const auto parent = promptNode ? promptNode->getParent().lock() : nullptr;
+  if (parent) {
+    promptNode = parent;
+  }
+}
+
+void CommandShell::showInvalidWord(const std::string& word) {
+  std::cout << std::endl;
+  std::cout << "Invalid command option '" << kRed << word << kDefaultColour << "'";
+  currentNode->displayHelp();
+}

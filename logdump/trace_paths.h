@@ -1,0 +1,41 @@
+#pragma once
+
+#include "platform/compression.h"
+
+#include <string>
+
+/// Where the manager keeps its traces and its collections, and how it names them.
+namespace vell::trace {
+
+extern const char* const kSnapshotFolder;     ///< Folder of the collections.
+extern const char* const kLogDirPrefix;       ///< First part of every collection's name.
+extern const char* const kLogTarExtension;    ///< Extension of a collection packed with tar(1).
+extern const char* const kLogTarGzExtension;  ///< The same, compressed with gzip(1).
+extern const char* const kScratchFolder;      ///< Folder of the live traces.
+
+extern const char* const kAlderTraceSnapshotDirectorySuffix;
+extern const char* const kBirchTraceSnapshotDirectorySuffix;
+extern const char* const kBirchQDSSTraceSnapshotDirectorySuffix;
+extern const char* const kAlderCoreDumpSnapshotDirectorySuffix;
+extern const char* const kBirchCoreDumpSnapshotDirectorySuffix;
+
+/// The suffix of a baseband trace's directory, by the family of the device's radio; `qdss` tells
+/// whether it is the QDSS trace. From any thread.
+std::string getBasebandTraceDirSuffix(bool qdss);
+
+/// The suffix of a core dump's directory, by the family of the device's radio, which is asked for
+/// once in the life of the process. From any thread, also while the process exits.
+std::string getCoreDumpDirSuffix();
+
+}  // namespace vell::trace
+
+namespace diag::config {
+
+extern const char* const kDIAGScratchDir;  ///< The live DIAG trace, below the scratch folder.
+extern const char* const kQDSSScratchDir;  ///< The live QDSS trace, below the scratch folder.
+
+}  // namespace diag::config
+
+/// The path of a collection: the snapshot folder, the prefix, `timestamp`, and a point with the
+/// extension that `mode` packs with, or `suffix` when it does not pack. From any thread.
+std::string buildLogPath(std::string timestamp, CompressionMode mode, std::string suffix);

@@ -1,0 +1,24 @@
+#pragma once
+
+#include "platform/compression.h"
+#include "platform/linux/settings_file.h"
+
+/// What the device is, as etc/vell/device.conf says. Each member has the default of its key.
+struct DeviceProfile {
+  int radioType = 0;
+  int productCode = 0;
+  int radioVendor = 0;
+  bool radioDiagQdss = false;
+  bool internalBuild = false;
+  bool carrierBuild = false;
+  CompressionMode defaultCompression = kCompressionNone;
+  bool compressionSupported = true;
+
+  /// Takes the known keys out of `file`, and leaves the others alone. A value that cannot be read
+  /// leaves the default, and a fault in `file`. From any thread.
+  static DeviceProfile from(SettingsFile& file);
+};
+
+/// The device's profile, read at the first call; what was wrong with it is then said in the system
+/// log. From any thread, also while the process exits.
+const DeviceProfile& deviceProfile();
