@@ -8,5 +8,3 @@ VellCommandBase::VellCommandBase(std::string nodeName, std::weak_ptr<CommandBase
     : CommandBase(std::move(nodeName), std::move(parentNode)),
       manager(std::move(managerClient)),
       queue(std::move(workQueue)) {}
-
-VellCommandBase::~VellCommandBase() = default;

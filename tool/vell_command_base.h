@@ -11,7 +11,7 @@
 /// the tool, and hands both to the children it creates.
 class VellCommandBase : public CommandBase {
  public:
-  ~VellCommandBase() override;
+  ~VellCommandBase() override = default;
 
   const std::shared_ptr<vell::client::Manager> manager;
   const WorkQueue queue;

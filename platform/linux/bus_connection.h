@@ -75,7 +75,7 @@ class BusConnection {
     BusSlotPtr slot;
   };
 
-  static int onReply(sd_bus_message* reply, void* pending, sd_bus_error* error);
+  static int onReply(sd_bus_message* reply, void* userdata, sd_bus_error* error);
 
   void run();
   bool runPosted();
@@ -83,7 +83,7 @@ class BusConnection {
   void process();
   void drop();
   void send(const BusCall& call, ReplyHandler handler);
-  [[nodiscard]] bool sendTo(sd_bus* bus, const BusCall& call, Pending& pending);
+  [[nodiscard]] bool sendTo(sd_bus* target, const BusCall& call, Pending& pending);
   void finish(std::list<Pending>::iterator pending, sd_bus_message* reply);
   [[nodiscard]] Clock::time_point wakeTime() const;
   void wait();

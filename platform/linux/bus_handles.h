@@ -34,5 +34,5 @@ class BusError {
   sd_bus_error* get() { return &error; }
 
  private:
-  sd_bus_error error = SD_BUS_ERROR_NULL;
+  sd_bus_error error = {nullptr, nullptr, 0};
 };

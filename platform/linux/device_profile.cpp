@@ -1,7 +1,5 @@
 #include "platform/linux/device_profile.h"
 
-#include "platform/linux/sysroot.h"
-
 #include <charconv>
 #include <optional>
 
@@ -63,17 +61,6 @@ void takeFlag(SettingsFile& file, const char* key, bool& member) {
        [](const std::string& text, bool& value) { return readInto(text, value); });
 }
 
-DeviceProfile readProfile() {
-  const auto path = sysroot() / "etc/vell/device.conf";
-  auto file = SettingsFile::read(path);
-  if (!file) {
-    return {};
-  }
-  const auto profile = DeviceProfile::from(*file);
-  reportFaults(path, file->faults);
-  return profile;
-}
-
 }  // namespace
 
 DeviceProfile DeviceProfile::from(SettingsFile& file) {
@@ -87,11 +74,5 @@ DeviceProfile DeviceProfile::from(SettingsFile& file) {
   take(file, "DEFAULT_COMPRESSION", "nocompress, tar.gz, tar or an integer",
        profile.defaultCompression, readCompression);
   takeFlag(file, "COMPRESSION_SUPPORTED", profile.compressionSupported);
-  return profile;
-}
-
-const DeviceProfile& deviceProfile() {
-  // Never destroyed: completions may still ask on another thread while the process exits.
-  static const auto& profile = *new DeviceProfile(readProfile());
   return profile;
 }

@@ -18,7 +18,3 @@ struct DeviceProfile {
   /// leaves the default, and a fault in `file`. From any thread.
   static DeviceProfile from(SettingsFile& file);
 };
-
-/// The device's profile, read at the first call; what was wrong with it is then said in the system
-/// log. From any thread, also while the process exits.
-const DeviceProfile& deviceProfile();

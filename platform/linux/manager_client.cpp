@@ -59,7 +59,7 @@ Answer answerWithoutManager(const std::string& command, const MessageDict& reque
   }
   MessageDict reply;
   reply.set(vell::kKeyTracePropertyValue, *saved);
-  return {{}, std::move(reply)};
+  return {CommandResult(), std::move(reply)};
 }
 
 MessageDict stateEvent(MessageDict::Value state) {

@@ -2,6 +2,29 @@
 
 #include "platform/compression.h"
 #include "platform/linux/device_profile.h"
+#include "platform/linux/settings_file.h"
+#include "platform/linux/sysroot.h"
+
+namespace {
+
+DeviceProfile readProfile() {
+  const auto path = sysroot() / "etc/vell/device.conf";
+  auto file = SettingsFile::read(path);
+  if (!file) {
+    return {};
+  }
+  const auto profile = DeviceProfile::from(*file);
+  reportFaults(path, file->faults);
+  return profile;
+}
+
+const DeviceProfile& deviceProfile() {
+  // Never destroyed: completions may still ask on another thread while the process exits.
+  static const auto& profile = *new DeviceProfile(readProfile());
+  return profile;
+}
+
+}  // namespace
 
 int radioType() {
   return deviceProfile().radioType;

@@ -1,0 +1,153 @@
+#include "simulator/device.h"
+
+#include "simulator/child_process.h"
+#include "simulator/complaint.h"
+#include "simulator/device_root.h"
+#include "simulator/service.h"
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <ctime>
+#include <fstream>
+#include <iostream>
+
+namespace simulator {
+
+namespace {
+
+constexpr int kStartTimeLimitMilliseconds = 20'000;
+constexpr timespec kTimeToObey = {3, 0};
+
+sigset_t deviceSignals() {
+  sigset_t signals;
+  sigemptyset(&signals);
+  for (const int signalNumber : {SIGCHLD, SIGINT, SIGTERM, SIGHUP}) {
+    sigaddset(&signals, signalNumber);
+  }
+  return signals;
+}
+
+/// Waits for a whole line, which tells that a service can be reached.
+bool awaitLine(int file) {
+  std::array<char, 512> buffer{};
+  pollfd readable = {file, POLLIN, 0};
+  while (poll(&readable, 1, kStartTimeLimitMilliseconds) > 0) {
+    const auto count = read(file, buffer.data(), buffer.size());
+    if (count <= 0) {
+      return false;
+    }
+    if (std::memchr(buffer.data(), '\n', static_cast<std::size_t>(count)) != nullptr) {
+      return true;
+    }
+  }
+  return false;
+}
+
+}  // namespace
+
+void blockDeviceSignals() {
+  const auto signals = deviceSignals();
+  sigprocmask(SIG_BLOCK, &signals, nullptr);
+}
+
+Device::Device(const DeviceRoot& deviceRoot)
+    : root(deviceRoot),
+      managerControl(open((deviceRoot.path() / kManagerControl).c_str(), O_RDWR | O_CLOEXEC)) {
+  setenv("VELL_SYSROOT", root.path().c_str(), 1);
+  setenv("DBUS_SYSTEM_BUS_ADDRESS", root.busAddress().c_str(), 1);
+}
+
+Device::~Device() {
+  for (const auto& [process, name] : services) {
+    kill(process, SIGKILL);
+    awaitChild(process);
+  }
+}
+
+bool Device::start(const DeviceModel& model) {
+  if (!managerControl) {
+    complain("cannot open the manager's control pipe");
+    return false;
+  }
+  if (!model.busRuns()) {
+    return true;
+  }
+  return startService("bus") && (!model.managerRuns() || startService("manager")) &&
+         (!model.helperRuns() || startService("helper"));
+}
+
+bool Device::startService(const std::string& name) {
+  int ends[2] = {-1, -1};
+  if (pipe2(ends, O_CLOEXEC) != 0) {
+    complain("cannot start " + name + ": " + std::strerror(errno));
+    return false;
+  }
+  const FileDescriptor readable(ends[0]);
+  FileDescriptor writable(ends[1]);
+  const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
+  const auto log = root.path() / kRequestLogDirectory / (name + ".log");
+  const pid_t process = startChild({self, "--serve", name, log.string()}, {},
+                                   name == "manager" ? managerControl.get() : -1, writable.get());
+  writable = FileDescriptor();
+  if (process > 0) {
+    services[process] = name;
+  }
+  const bool reachable = process > 0 && awaitLine(readable.get());
+  if (!reachable) {
+    complain("the device's " + name + " did not start");
+    std::cerr << std::ifstream(log).rdbuf();
+  }
+  return reachable;
+}
+
+int Device::run(const std::vector<std::string>& command) {
+  const pid_t process = startChild(command, {SIGHUP, false}, -1, -1);
+  if (process < 0) {
+    return EXIT_FAILURE;
+  }
+  const auto signals = deviceSignals();
+  bool ending = false;
+  auto status = reap(process);
+  for (; !status; status = reap(process)) {
+    siginfo_t info{};
+    const int received =
+        ending ? sigtimedwait(&signals, &info, &kTimeToObey) : sigwaitinfo(&signals, &info);
+    if (received < 0 && errno == EAGAIN) {
+      kill(process, SIGKILL);
+    }
+    // What the terminal sends for its interrupt key has reached the command already.
+    const bool fromTerminal = received == SIGINT && info.si_code == SI_KERNEL;
+    if (received > 0 && received != SIGCHLD && !fromTerminal) {
+      kill(process, received);
+      ending = true;
+    }
+  }
+  return *status;
+}
+
+std::optional<int> Device::reap(pid_t command) {
+  std::optional<int> commandStatus;
+  int status = 0;
+  for (pid_t ended = waitpid(-1, &status, WNOHANG); ended > 0;
+       ended = waitpid(-1, &status, WNOHANG)) {
+    if (ended == command) {
+      commandStatus = exitStatusOf(status);
+      continue;
+    }
+    const auto service = services.extract(ended);
+    if (service && exitStatusOf(status) == kStatusRestart) {
+      startService(service.mapped());
+    }
+  }
+  return commandStatus;
+}
+
+}  // namespace simulator

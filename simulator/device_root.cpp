@@ -1,0 +1,138 @@
+#include "simulator/device_root.h"
+
+#include "simulator/complaint.h"
+
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <fstream>
+#include <string_view>
+#include <system_error>
+
+namespace simulator {
+
+namespace {
+
+namespace fs = std::filesystem;
+
+/// Throws std::system_error.
+void writeFile(const fs::path& path, const std::string& text) {
+  fs::create_directories(path.parent_path());
+  std::ofstream file(path, std::ios::binary);
+  file << text << std::flush;
+  if (!file) {
+    throw std::system_error(errno, std::generic_category(), path);
+  }
+}
+
+/// As a value of a bus address: what has a meaning there is written in hexadecimal. That leaves
+/// nothing that has one in XML.
+std::string escapeForAddress(const std::string& text) {
+  constexpr std::string_view kPlain =
+      "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789-_/.*";
+  constexpr std::string_view kDigits = "0123456789abcdef";
+  std::string escaped;
+  for (const char character : text) {
+    if (kPlain.find(character) != std::string_view::npos) {
+      escaped += character;
+      continue;
+    }
+    const auto byte = static_cast<unsigned char>(character);
+    escaped += {'%', kDigits[byte / kDigits.size()], kDigits[byte % kDigits.size()]};
+  }
+  return escaped;
+}
+
+/// A bus on which everybody may do everything: it is the device's owner who runs it.
+std::string busConfiguration(const std::string& address) {
+  return "<!DOCTYPE busconfig PUBLIC \"-//freedesktop//DTD D-Bus Bus Configuration 1.0//EN\"\n"
+         " \"http://www.freedesktop.org/standards/dbus/1.0/busconfig.dtd\">\n"
+         "<busconfig>\n"
+         "  <listen>" +
+         address +
+         "</listen>\n"
+         "  <auth>EXTERNAL</auth>\n"
+         "  <policy context=\"default\">\n"
+         "    <allow user=\"*\"/>\n"
+         "    <allow own=\"*\"/>\n"
+         "    <allow send_destination=\"*\"/>\n"
+         "    <allow receive_sender=\"*\"/>\n"
+         "  </policy>\n"
+         "</busconfig>\n";
+}
+
+/// The settings in the syntax that the settings files of the device have.
+std::string settingsText(const std::map<std::string, std::string>& settings) {
+  std::string text;
+  for (const auto& [key, value] : settings) {
+    text += key + "=\"";
+    for (const char character : value) {
+      text += character == '"' || character == '\\' ? std::string{'\\', character}
+                                                    : std::string{character};
+    }
+    text += "\"\n";
+  }
+  return text;
+}
+
+/// Writes the process table; see proc(5).
+void writeProcesses(const fs::path& table, const std::vector<std::string>& names) {
+  constexpr std::size_t kLongestCommandName = 15;
+  constexpr int kFirstProcess = 100;
+  fs::create_directories(table);
+  int process = kFirstProcess;
+  for (const auto& name : names) {
+    const auto entry = table / std::to_string(process++);
+    writeFile(entry / "comm", name.substr(0, kLongestCommandName) + "\n");
+    fs::create_symlink("/usr/libexec/" + name, entry / "exe");
+  }
+}
+
+}  // namespace
+
+std::unique_ptr<DeviceRoot> DeviceRoot::create(const Profile& profile) {
+  try {
+    auto pattern = (fs::temp_directory_path() / "vell-simulator-XXXXXX").string();
+    if (mkdtemp(pattern.data()) == nullptr) {
+      throw std::system_error(errno, std::generic_category(), pattern);
+    }
+    std::unique_ptr<DeviceRoot> root(new DeviceRoot(fs::canonical(pattern)));
+    root->fill(profile);
+    return root;
+  } catch (const std::system_error& error) {
+    complain(std::string("cannot make a device: ") + error.what());
+    return nullptr;
+  }
+}
+
+DeviceRoot::~DeviceRoot() {
+  std::error_code error;
+  fs::remove_all(root, error);
+  if (error) {
+    complain("cannot remove " + root.string() + ": " + error.message());
+  }
+}
+
+std::string DeviceRoot::busAddress() const {
+  return "unix:path=" + escapeForAddress((root / kBusSocket).string());
+}
+
+void DeviceRoot::fill(const Profile& profile) const {
+  writeFile(root / kDeviceProfile, profile.text);
+  writeFile(root / kBusConfiguration, busConfiguration(busAddress()));
+  writeProcesses(root / "proc", profile.model.processes());
+  if (const auto traces = profile.model.savedTraces()) {
+    writeFile(root / kSavedTraces, settingsText(*traces));
+  }
+  fs::create_directories(root / kRequestLogDirectory);
+  fs::create_directories(root / kSnapshotDirectory);
+  for (const auto* const directory : kScratchDirectories) {
+    fs::create_directories(root / directory);
+  }
+  if (mkfifo((root / kManagerControl).c_str(), S_IRUSR | S_IWUSR) != 0) {
+    throw std::system_error(errno, std::generic_category(), kManagerControl);
+  }
+}
+
+}  // namespace simulator

@@ -1,0 +1,100 @@
+// The simulated device's entry point: a whole device, or one of its services alone.
+
+#include "platform/linux/sysroot.h"
+#include "simulator/complaint.h"
+#include "simulator/device.h"
+#include "simulator/device_root.h"
+#include "simulator/helper_service.h"
+#include "simulator/manager_service.h"
+#include "simulator/options.h"
+#include "simulator/profile.h"
+
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <fstream>
+#include <iostream>
+
+namespace {
+
+using simulator::complain;
+
+constexpr int kUsageError = 2;
+
+/// Becomes the daemon, which prints its address on standard output once it can be reached. What it
+/// has to say otherwise goes to `log`, or to standard error when that is empty.
+int serveBus(const std::string& log) {
+  if (!log.empty() && std::freopen(log.c_str(), "a", stderr) == nullptr) {
+    complain(log + ": " + std::strerror(errno));
+  }
+  const auto configuration = "--config-file=" + (sysroot() / simulator::kBusConfiguration).string();
+  // A socket that an earlier daemon left behind would be in the way.
+  unlink((sysroot() / simulator::kBusSocket).c_str());
+  execlp("dbus-daemon", "dbus-daemon", "--nofork", "--nopidfile", "--nosyslog", "--print-address",
+         configuration.c_str(), nullptr);
+  complain(std::string("dbus-daemon: ") + std::strerror(errno));
+  return EXIT_FAILURE;
+}
+
+template <typename NamedService>
+int serveNamed(const simulator::DeviceModel& device, const std::string& requestLog) {
+  const simulator::RequestLog log(requestLog);
+  NamedService service(device, sysroot(), log);
+  if (!service.connect()) {
+    return EXIT_FAILURE;
+  }
+  std::cout << "ready" << std::endl;
+  return service.run();
+}
+
+int serve(const simulator::Options& options) {
+  if (isLocalMachine()) {
+    complain("--serve works inside a simulated device only");
+    return EXIT_FAILURE;
+  }
+  std::ofstream(sysroot() / "run" / (options.service + ".pid")) << getpid() << "\n";
+  if (options.service == "bus") {
+    return serveBus(options.requestLog);
+  }
+  const auto path = sysroot() / simulator::kDeviceProfile;
+  const auto profile = SettingsFile::read(path).value_or(SettingsFile());
+  const auto device = simulator::describeDevice(profile, path);
+  if (!device) {
+    return EXIT_FAILURE;
+  }
+  return options.service == "manager"
+             ? serveNamed<simulator::ManagerService>(*device, options.requestLog)
+             : serveNamed<simulator::HelperService>(*device, options.requestLog);
+}
+
+std::vector<std::string> usersShell() {
+  const char* shell = std::getenv("SHELL");
+  return {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
+}
+
+int runDevice(const simulator::Options& options) {
+  simulator::blockDeviceSignals();
+  const auto profile = simulator::loadProfile(options.profile);
+  const auto root = profile ? simulator::DeviceRoot::create(*profile) : nullptr;
+  if (!root) {
+    return EXIT_FAILURE;
+  }
+  simulator::Device device(*root);
+  if (!device.start(profile->model)) {
+    return EXIT_FAILURE;
+  }
+  return device.run(options.command.empty() ? usersShell() : options.command);
+}
+
+}  // namespace
+
+int main(int count, char** words) {
+  const auto options = simulator::parseOptions({words + (count > 0 ? 1 : 0), words + count});
+  if (!options) {
+    return kUsageError;
+  }
+  return options->service.empty() ? runDevice(*options) : serve(*options);
+}

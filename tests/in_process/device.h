@@ -1,0 +1,50 @@
+#pragma once
+
+#include "platform/linux/device_profile.h"
+#include "platform/message_dict.h"
+#include "simulator/device_model.h"
+
+#include <mutex>
+#include <optional>
+#include <string>
+#include <vector>
+
+/// The device behind the in-process platform: the tests' own side of every service.
+namespace in_process {
+
+/// One request, as the manager or the helper received it.
+struct Request {
+  std::string command;
+  MessageDict arguments;
+
+  friend bool operator==(const Request&, const Request&) = default;
+};
+
+/// What a test sets before it acts, and reads after it has acted.
+struct Device {
+  simulator::DeviceModel model;
+  DeviceProfile profile;
+  bool managerRuns = true;
+  std::string programName = "velltool";
+  std::vector<std::string> clientNames;  ///< Of each client of the manager that was opened.
+  std::vector<std::string> queueLabels;  ///< Of the queue that each of them was handed.
+
+  void record(Request request);
+  std::vector<Request> requests();
+
+ private:
+  std::mutex mutex;
+  std::vector<Request> received;  // guarded by mutex
+};
+
+/// The device there is.
+Device& device();
+
+/// Puts a new device, of a profile in the simulator's format, in place of the one there is. A
+/// profile that cannot be read ends the test program.
+Device& startDevice(const std::string& profileText);
+
+/// Has the manager send an event to every client, and returns when it has been handled.
+void sendEvent(const std::string& name, const MessageDict& payload);
+
+}  // namespace in_process

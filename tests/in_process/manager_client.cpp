@@ -1,0 +1,104 @@
+#include "platform/manager_client.h"
+
+#include "platform/manager_names.h"
+#include "tests/in_process/device.h"
+
+#include <future>
+#include <map>
+#include <utility>
+#include <vector>
+
+class vell::client::Manager {
+ public:
+  explicit Manager(WorkQueue workQueue) : queue(std::move(workQueue)) {}
+
+  /// Has `name` handled on the queue, and returns when it has been.
+  void deliver(const std::string& name, const MessageDict& payload) {
+    const auto handler = handlers.find(name);
+    if (!on || handler == handlers.end()) {
+      return;
+    }
+    std::promise<void> handled;
+    queue.submit([&] {
+      handler->second(payload, WorkGroup::create());
+      handled.set_value();
+    });
+    handled.get_future().wait();
+  }
+
+  const WorkQueue queue;
+  std::map<std::string, EventHandler> handlers;
+  bool on = false;
+};
+
+namespace {
+
+constexpr std::int32_t kStatusBusFailure = 1;
+
+// Kept to the end: a handler may hold its own client, as the tool's does.
+std::vector<std::shared_ptr<vell::client::Manager>>& clients() {
+  static std::vector<std::shared_ptr<vell::client::Manager>> opened;
+  return opened;
+}
+
+std::pair<CommandResult, MessageDict> answerTo(const std::string& command,
+                                               const MessageDict& request) {
+  auto& device = in_process::device();
+  if (!device.managerRuns) {
+    return {{vell::kStatusManagerNotRunning, ""}, MessageDict::notADictionary()};
+  }
+  device.record({command, request});
+  auto answer = device.model.performCommand(command, request);
+  if (answer.conduct != simulator::Conduct::Reply) {
+    return {{kStatusBusFailure, ""}, MessageDict::notADictionary()};
+  }
+  return {{answer.status, answer.message}, answer.reply};
+}
+
+}  // namespace
+
+void in_process::sendEvent(const std::string& name, const MessageDict& payload) {
+  for (const auto& client : clients()) {
+    client->deliver(name, payload);
+  }
+}
+
+std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::string& clientName,
+                                                                   WorkQueue queue) {
+  in_process::device().clientNames.push_back(clientName);
+  in_process::device().queueLabels.push_back(queue.label());
+  return clients().emplace_back(std::make_shared<Manager>(std::move(queue)));
+}
+
+void vell::client::RegisterEventHandler(std::shared_ptr<Manager> manager,
+                                        const std::string& eventName, EventHandler handler) {
+  manager->handlers[eventName] = std::move(handler);
+}
+
+void vell::client::EventsOn(std::shared_ptr<Manager> manager) {
+  manager->on = true;
+  MessageDict stopped;
+  stopped.set(kKeyServerState, "Stopped");
+  const auto& device = in_process::device();
+  manager->deliver(kEventServerStateChange,
+                   device.managerRuns ? device.model.serverStatePayload() : stopped);
+}
+
+void vell::client::EventsOff(std::shared_ptr<Manager> manager) {
+  manager->on = false;
+}
+
+void vell::client::PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
+                                  Completion completion, MessageDict request) {
+  manager->queue.submit([completion = std::move(completion), answer = answerTo(command, request)] {
+    completion(answer.first, answer.second);
+  });
+}
+
+CommandResult vell::client::PerformCommand(std::shared_ptr<Manager> /*manager*/,
+                                           const std::string& command, MessageDict request,
+                                           MessageDict* reply) {
+  auto [result, payload] = answerTo(command, request);
+  *reply = std::move(payload);
+  return result;
+}

@@ -1,0 +1,46 @@
+#include "platform/work_queue.h"
+
+#include <gtest/gtest.h>
+
+#include <future>
+#include <optional>
+#include <string>
+
+TEST(WorkQueue, RunsEverythingInOrderBeforeItsLastHandleGoes) {
+  std::string log;
+  {
+    std::promise<void> gate;
+    std::optional<WorkQueue> queue("test");
+    queue->submit([&] { gate.get_future().wait(); });
+    for (const char letter : {'a', 'b', 'c'}) {
+      queue->submit([&log, letter] { log += letter; });
+    }
+    gate.set_value();
+    const auto last = *queue;
+    queue.reset();
+    last.submit([&log] { log += 'd'; });
+  }
+  EXPECT_EQ(log, "abcd");
+}
+
+TEST(WorkQueue, ReleasesAClosureAsSoonAsItHasRun) {
+  const WorkQueue queue("test");
+  auto token = std::make_shared<int>();
+  const std::weak_ptr<int> watch = token;
+  queue.submit([held = std::move(token)] {});
+  std::promise<bool> released;
+  queue.submit([&] { released.set_value(watch.expired()); });
+  EXPECT_TRUE(released.get_future().get());
+}
+
+TEST(WorkQueue, MayLoseItsLastHandleOnItsOwnThread) {
+  std::promise<void> done;
+  {
+    auto queue = std::make_unique<WorkQueue>("test");
+    auto* const raw = queue.get();
+    raw->submit([held = std::shared_ptr<WorkQueue>(std::move(queue)), &done] {
+      held->submit([&done] { done.set_value(); });
+    });
+  }
+  done.get_future().wait();
+}
