@@ -1,6 +1,7 @@
 #include "logdump/logdump_command.h"
 
 #include "logdump/baseband_logs.h"
+#include "logdump/os_log_handler.h"
 #include "logdump/telephony_logs.h"
 #include "tool/server_state.h"
 
@@ -27,6 +28,9 @@ void LogdumpCommand::registerCommands() {
       "[nocompress|tar.gz|tar] [nonui] <reason> collect telephony logs with coredump");
   addCommandHandler("bb", makeBasebandLogsHandler(*this),
                     "[nocompress|tar.gz|tar] <reason> collect baseband logs only");
+  addCommandHandler("oslog", makeOsLogHandler(),
+                    "[history size] [output txt file path] -p <process1 process2..> "
+                    "-i <imagePath1 imagePath2..> collect oslog to txt");
 }
 
 bool LogdumpCommand::isAllowed(std::string word) {

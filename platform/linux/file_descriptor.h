@@ -26,6 +26,9 @@ class FileDescriptor {
 
   [[nodiscard]] int get() const { return number; }
 
+  /// Gives up ownership.
+  int release() { return std::exchange(number, -1); }
+
  private:
   int number;
 };

@@ -3,6 +3,9 @@
 #include <string>
 #include <string_view>
 
+/// Whether `bytes` are valid UTF-8 (RFC 3629). From any thread.
+bool isValidUtf8(std::string_view bytes);
+
 /// `bytes` as valid UTF-8 (RFC 3629): each broken sequence, as long as it can be read as one,
 /// becomes U+FFFD; well-formed text comes back as it is. From any thread.
 std::string validUtf8(std::string_view bytes);

@@ -1,0 +1,35 @@
+#pragma once
+
+#include "platform/linux/entry_batch.h"
+
+#include <condition_variable>
+#include <deque>
+#include <mutex>
+#include <vector>
+
+/// Carries batches from the thread that reads to the thread that delivers, a few at a time, and the
+/// emptied ones back.
+class EntryPipe {
+ public:
+  /// Hands on `batch` and leaves an empty one in its place; waits for room. False, and the entries
+  /// are gone, when the pipe was closed. By the reading thread.
+  bool push(EntryBatch& batch);
+
+  /// Says that nothing more will come. By the reading thread.
+  void finish();
+
+  /// Swaps `batch` for the next one; waits for it. False when nothing more will come or the pipe
+  /// was closed. By the delivering thread.
+  bool pop(EntryBatch& batch);
+
+  /// Says that nothing more is wanted, and ends every wait. From any thread.
+  void close();
+
+ private:
+  std::mutex mutex;
+  std::condition_variable changed;
+  std::deque<EntryBatch> filled;    ///< Guarded by `mutex`.
+  std::vector<EntryBatch> emptied;  ///< Guarded by `mutex`.
+  bool finished = false;            ///< Guarded by `mutex`.
+  bool closed = false;              ///< Guarded by `mutex`.
+};

@@ -1,0 +1,76 @@
+#include "platform/files.h"
+
+#include "platform/linux/file_descriptor.h"
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <utility>
+
+namespace {
+
+constexpr int kPatienceMilliseconds = 10'000;
+constexpr mode_t kOwnerAlone = S_IRUSR | S_IWUSR;
+
+/// Without O_NONBLOCK, a pipe that nobody reads would hold up the open, and later the write.
+constexpr int kWriting = O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+
+/// Opens for writing what is at `path`; a text with a NUL is the path of nothing.
+FileDescriptor openForWriting(const std::string& path, int flags) {
+  if (path.find('\0') != std::string::npos) {
+    return FileDescriptor();
+  }
+  return FileDescriptor(open(path.c_str(), kWriting | flags, kOwnerAlone));
+}
+
+/// Waits until a pipe or terminal takes more.
+std::error_code waitForRoom(int file) {
+  pollfd waiting{file, POLLOUT, 0};
+  const int ready = poll(&waiting, 1, kPatienceMilliseconds);
+  if (ready == 0) {
+    return std::make_error_code(std::errc::timed_out);
+  }
+  return ready < 0 && errno != EINTR ? std::error_code(errno, std::generic_category())
+                                     : std::error_code();
+}
+
+/// With O_APPEND every write(2) moves to the end of the file first, in the one call.
+class AppendedFile : public WritableFile {
+ public:
+  explicit AppendedFile(FileDescriptor opened) : file(std::move(opened)) {}
+
+  std::error_code append(std::string_view bytes) override {
+    std::error_code error;
+    while (!bytes.empty() && !error) {
+      const auto written = write(file.get(), bytes.data(), bytes.size());
+      if (written >= 0) {
+        bytes.remove_prefix(static_cast<std::size_t>(written));
+      } else if (errno == EAGAIN) {
+        error = waitForRoom(file.get());
+      } else if (errno != EINTR) {
+        error.assign(errno, std::generic_category());
+      }
+    }
+    return error;
+  }
+
+ private:
+  FileDescriptor file;
+};
+
+}  // namespace
+
+void createEmptyFile(const std::string& path) {
+  struct stat there {};
+  if (stat(path.c_str(), &there) == 0 && !S_ISREG(there.st_mode)) {
+    return;
+  }
+  openForWriting(path, O_CREAT | O_TRUNC);
+}
+
+std::unique_ptr<WritableFile> WritableFile::open(const std::string& path) {
+  auto file = openForWriting(path, O_APPEND);
+  return file ? std::make_unique<AppendedFile>(std::move(file)) : nullptr;
+}

@@ -1,0 +1,7 @@
+#pragma once
+
+#include <string>
+
+/// `text`, which is valid UTF-8, as it is compared when case and diacritics are ignored: full case
+/// folding, no marks, and the same for composed and decomposed forms. From any thread.
+std::string foldedText(const std::string& text);

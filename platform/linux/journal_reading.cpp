@@ -1,0 +1,124 @@
+#include "platform/linux/journal_reading.h"
+
+#include "platform/linux/entry_decoder.h"
+
+#include <algorithm>
+#include <functional>
+#include <utility>
+
+namespace {
+
+/// How many entries are looked at before the reading comes back without a full batch.
+constexpr std::size_t kStepsAtOnce = 4096;
+
+/// Whether the last entry is one that another file has given already: the system copies entries
+/// from file to file, for instance when the disk becomes writable.
+bool isLastACopy(const EntryBatch& batch) {
+  const auto last = batch.size() - 1;
+  const auto& stamp = batch.stampOf(last);
+  for (auto at = last; at-- > 0 && batch.stampOf(at).realtime == stamp.realtime;) {
+    const auto& other = batch.stampOf(at);
+    if (other.file != stamp.file && other.monotonic == stamp.monotonic &&
+        batch.valuesOf(at) == batch.valuesOf(last)) {
+      return true;
+    }
+  }
+  return false;
+}
+
+}  // namespace
+
+JournalReading::JournalReading(const std::optional<LogFilter>& filter, LogTime from)
+    : selection(filter), start(from) {
+  auto opened = openJournalFiles();
+  allOpened = !opened.damaged;
+  for (auto& file : opened.opened) {
+    const bool grows = file.grows;
+    files.emplace_back(std::move(file), from);
+    // The end of a file that does not change can wait to be found until its turn comes.
+    if (grows && files.back().isOpen()) {
+      files.back().start(selection);
+    }
+    waitForTurn(files.size() - 1);
+  }
+}
+
+bool JournalReading::read(EntryBatch& batch) {
+  std::uint64_t realtime = 0;
+  // Entries of the same time stay in one batch, where copies are found.
+  for (std::size_t steps = 0; (steps < kStepsAtOnce && !batch.isFull()) || isNextAt(realtime);
+       ++steps) {
+    if (!current && !takeTurn()) {
+      return false;
+    }
+    realtime = files[*current].realtime();
+    readEntry(batch);
+    advance();
+  }
+  return true;
+}
+
+bool JournalReading::isComplete() const {
+  return allOpened && std::none_of(files.begin(), files.end(),
+                                   [](const JournalFileScan& file) { return file.isDamaged(); });
+}
+
+/// Puts the current file's entry into `batch`, if it can be read and is wanted.
+void JournalReading::readEntry(EntryBatch& batch) {
+  auto& file = files[*current];
+  EntryBatch::Stamp stamp{file.realtime(), 0, *current};
+  const bool lastIsOfSameTime =
+      !batch.isEmpty() && batch.stampOf(batch.size() - 1).realtime == stamp.realtime;
+  const bool nextIsOfSameTime = !turns.empty() && turns.front().realtime == stamp.realtime;
+  if (lastIsOfSameTime || nextIsOfSameTime) {
+    stamp.monotonic = file.monotonic();
+  }
+  if (file.read(stamp, batch) && (!isWanted(batch) || (lastIsOfSameTime && isLastACopy(batch)))) {
+    batch.dropLast();
+  }
+}
+
+bool JournalReading::isWanted(const EntryBatch& batch) const {
+  const auto last = batch.size() - 1;
+  const auto sourceTime = batch.valueOf(last, JournalField::SourceTime);
+  return entryTime(sourceTime, batch.stampOf(last).realtime) >= start &&
+         (selection.isEverything() || selection.selects(batch.valuesOf(last)));
+}
+
+/// Goes to the current file's next entry, and lets another file have its turn if that is older.
+void JournalReading::advance() {
+  auto& file = files[*current];
+  file.advance();
+  if (!file.isOpen() || (!turns.empty() && turns.front() < Turn{file.realtime(), *current})) {
+    waitForTurn(*std::exchange(current, std::nullopt));
+  }
+}
+
+void JournalReading::waitForTurn(std::size_t file) {
+  if (files[file].isOpen()) {
+    turns.push_back({files[file].realtime(), file});
+    std::push_heap(turns.begin(), turns.end(), std::greater<>());
+  }
+}
+
+/// Gives the turn to the file whose next entry is the oldest. False when no file has one left.
+bool JournalReading::takeTurn() {
+  while (!current && !turns.empty()) {
+    std::pop_heap(turns.begin(), turns.end(), std::greater<>());
+    const auto next = turns.back().file;
+    turns.pop_back();
+    if (files[next].isStarted()) {
+      current = next;
+    } else {
+      files[next].start(selection);
+      waitForTurn(next);
+    }
+  }
+  return current.has_value();
+}
+
+/// Whether the next entry was stored at `realtime`.
+bool JournalReading::isNextAt(std::uint64_t realtime) const {
+  return current ? files[*current].realtime() == realtime
+                 : !turns.empty() && turns.front().realtime == realtime;
+}

@@ -1,0 +1,45 @@
+#pragma once
+
+#include "platform/linux/entry_batch.h"
+#include "platform/linux/journal_file_scan.h"
+#include "platform/linux/log_selection.h"
+
+#include <cstdint>
+#include <optional>
+#include <vector>
+
+/// Reads the selected entries of the device's journals from a point in time up to what is stored
+/// when the reading starts, oldest first across all files. On one thread.
+class JournalReading {
+ public:
+  JournalReading(const std::optional<LogFilter>& filter, LogTime from);
+
+  /// Adds entries to `batch`, none at times: until it is full, or it is time to look around, or all
+  /// are read. Returns false in the last case.
+  bool read(EntryBatch& batch);
+
+  /// Whether nothing was found that could not be read.
+  [[nodiscard]] bool isComplete() const;
+
+ private:
+  /// A file waits for its turn, which comes when its next entry is the oldest.
+  struct Turn {
+    std::uint64_t realtime;
+    std::size_t file;
+    auto operator<=>(const Turn&) const = default;
+  };
+
+  void readEntry(EntryBatch& batch);
+  [[nodiscard]] bool isWanted(const EntryBatch& batch) const;
+  void advance();
+  bool takeTurn();
+  void waitForTurn(std::size_t file);
+  [[nodiscard]] bool isNextAt(std::uint64_t realtime) const;
+
+  LogSelection selection;
+  LogTime start;
+  std::vector<JournalFileScan> files;
+  std::vector<Turn> turns;             ///< A heap, the next turn in front.
+  std::optional<std::size_t> current;  ///< The file whose turn it is.
+  bool allOpened = true;
+};

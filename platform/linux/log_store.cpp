@@ -1,0 +1,183 @@
+#include "platform/log_store.h"
+
+#include "platform/linux/entry_decoder.h"
+#include "platform/linux/entry_pipe.h"
+#include "platform/linux/journal_reading.h"
+
+#include <atomic>
+#include <csignal>
+#include <cstring>
+#include <system_error>
+#include <thread>
+#include <utility>
+
+/// The device's journals, of which one at least can be read.
+class LogSource {};
+
+void LogStore::prepare(const Completion& completion) {
+  const auto files = openJournalFiles(1);
+  if (!files.opened.empty()) {
+    completion(std::make_shared<LogSource>(), std::nullopt);
+  } else {
+    completion(nullptr, LogStoreError{files.error == 0 ? "No journal files were found"
+                                                       : std::strerror(files.error)});
+  }
+}
+
+namespace {
+
+constexpr unsigned kSupportedFlags =
+    kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
+
+/// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
+/// on this thread shows as an error then. Threads started from here on do the same.
+void blockSignals() {
+  sigset_t blocked{};
+  sigfillset(&blocked);
+  for (const int fault : {SIGBUS, SIGFPE, SIGILL, SIGSEGV}) {
+    sigdelset(&blocked, fault);
+  }
+  pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
+}
+
+}  // namespace
+
+/// What a reader and its threads share. One thread reads the journals, the other, which is the
+/// reader's own as far as the outside goes, delivers.
+class LogReader::Session {
+ public:
+  /// `self` owns this; the thread keeps it until it has run out.
+  void start(const std::shared_ptr<Session>& self, LogTime from);
+  void stop();
+
+  /// Ends the thread in good order when it is at its end, and else lets it run out on its own.
+  void release();
+
+  unsigned flags = 0;
+  std::optional<LogFilter> filter;
+  EntryHandler entryHandler;
+  InvalidationHandler invalidationHandler;
+
+ private:
+  void run(LogTime from);
+  unsigned long deliverAll(LogTime from);
+  void deliver(const EntryBatch& batch);
+  bool readIntoPipe(LogTime from);
+  void end(unsigned long reason);
+
+  LogTime position;  ///< Belongs to the delivering thread once it is started.
+  EntryDecoder decoder;
+  EntryPipe pipe;
+  std::atomic<bool> stopped = false;
+  std::atomic<bool> ended = false;
+  std::thread delivering;
+};
+
+void LogReader::Session::start(const std::shared_ptr<Session>& self, LogTime from) {
+  position = from;
+  try {
+    delivering = std::thread([self, from] { self->run(from); });
+  } catch (const std::system_error&) {
+    end(kLogReaderReadError);
+  }
+}
+
+void LogReader::Session::stop() {
+  stopped = true;
+  pipe.close();
+}
+
+void LogReader::Session::release() {
+  if (!ended) {
+    stop();
+  }
+  if (delivering.joinable() && ended) {
+    delivering.join();
+  } else if (delivering.joinable()) {
+    delivering.detach();
+  }
+}
+
+void LogReader::Session::run(LogTime from) {
+  blockSignals();
+  const auto reason = flags == kSupportedFlags ? deliverAll(from) : kLogReaderUnsupported;
+  if (!stopped) {
+    end(reason);
+  }
+}
+
+void LogReader::Session::end(unsigned long reason) {
+  ended = true;
+  if (invalidationHandler) {
+    invalidationHandler(reason, position);
+  }
+}
+
+unsigned long LogReader::Session::deliverAll(LogTime from) {
+  bool complete = false;
+  try {
+    std::thread reading([this, from, &complete] { complete = readIntoPipe(from); });
+    EntryBatch batch;
+    while (pipe.pop(batch)) {
+      deliver(batch);
+    }
+    reading.join();
+  } catch (const std::system_error&) {
+    // There is no thread to be had.
+  }
+  return complete ? kLogReaderAtEnd : kLogReaderReadError;
+}
+
+void LogReader::Session::deliver(const EntryBatch& batch) {
+  for (std::size_t at = 0; at < batch.size() && !stopped; ++at) {
+    const auto entry = decoder.decode(batch.valuesOf(at), batch.stampOf(at).realtime);
+    position = entry.time;
+    if (entryHandler) {
+      entryHandler(entry);
+    }
+  }
+}
+
+/// Reads everything, or until the reader is stopped. Returns whether nothing is missing.
+bool LogReader::Session::readIntoPipe(LogTime from) {
+  JournalReading reading(filter, from);
+  EntryBatch batch;
+  bool more = true;
+  while (more && !stopped) {
+    more = reading.read(batch);
+    more = (batch.isEmpty() || pipe.push(batch)) && more;
+  }
+  pipe.finish();
+  return reading.isComplete();
+}
+
+LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/)
+    : session(std::make_shared<Session>()) {}
+
+LogReader::~LogReader() {
+  session->release();
+}
+
+void LogReader::setFlags(unsigned flags) {
+  session->flags = flags;
+}
+
+void LogReader::setFilter(LogFilter filter) {
+  session->filter = std::move(filter);
+}
+
+void LogReader::setEntryHandler(EntryHandler handler) {
+  session->entryHandler = std::move(handler);
+}
+
+void LogReader::setInvalidationHandler(InvalidationHandler handler) {
+  session->invalidationHandler = std::move(handler);
+}
+
+void LogReader::activate(LogTime from) {
+  session->start(session, from);
+}
+
+void LogReader::invalidate() {
+  session->stop();
+}
