@@ -34,6 +34,7 @@ in_process::Device& in_process::device() {
 }
 
 in_process::Device& in_process::startDevice(const std::string& profileText) {
+  closeClients();
   auto file = SettingsFile::parse(profileText);
   auto faults = file.faults;
   auto& started = *(present() = std::make_unique<Device>());

@@ -44,6 +44,9 @@ Device& device();
 /// profile that cannot be read ends the test program.
 Device& startDevice(const std::string& profileText);
 
+/// Lets go of the clients of the device there is.
+void closeClients();
+
 /// Has the manager send an event to every client, and returns when it has been handled.
 void sendEvent(const std::string& name, const MessageDict& payload);
 

@@ -35,10 +35,25 @@ namespace {
 
 constexpr std::int32_t kStatusBusFailure = 1;
 
-// Kept to the end: a handler may hold its own client, as the tool's does.
-std::vector<std::shared_ptr<vell::client::Manager>>& clients() {
-  static std::vector<std::shared_ptr<vell::client::Manager>> opened;
-  return opened;
+/// The clients of the present device. A handler may hold its own client, as the tool's does, so
+/// they are let go by hand.
+class Clients {
+ public:
+  ~Clients() { close(); }
+
+  void close() {
+    for (const auto& client : opened) {
+      client->handlers.clear();
+    }
+    opened.clear();
+  }
+
+  std::vector<std::shared_ptr<vell::client::Manager>> opened;
+};
+
+Clients& clients() {
+  static Clients present;
+  return present;
 }
 
 std::pair<CommandResult, MessageDict> answerTo(const std::string& command,
@@ -57,8 +72,12 @@ std::pair<CommandResult, MessageDict> answerTo(const std::string& command,
 
 }  // namespace
 
+void in_process::closeClients() {
+  clients().close();
+}
+
 void in_process::sendEvent(const std::string& name, const MessageDict& payload) {
-  for (const auto& client : clients()) {
+  for (const auto& client : clients().opened) {
     client->deliver(name, payload);
   }
 }
@@ -67,7 +86,7 @@ std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::st
                                                                    WorkQueue queue) {
   in_process::device().clientNames.push_back(clientName);
   in_process::device().queueLabels.push_back(queue.label());
-  return clients().emplace_back(std::make_shared<Manager>(std::move(queue)));
+  return clients().opened.emplace_back(std::make_shared<Manager>(std::move(queue)));
 }
 
 void vell::client::RegisterEventHandler(std::shared_ptr<Manager> manager,
