@@ -41,7 +41,8 @@ void RegisterEventHandler(std::shared_ptr<Manager> manager, const std::string& e
 /// state is "Stopped" while no manager runs; its coming and going are delivered as such events too.
 void EventsOn(std::shared_ptr<Manager> manager);
 
-/// Stops the delivery: no handler is called for an event that had not reached its handler yet.
+/// Stops the delivery: no handler is called any more. One that runs on another thread at that
+/// moment is waited for, so not to be called with a lock held that a handler takes.
 void EventsOff(std::shared_ptr<Manager> manager);
 
 /// Sends a command and returns at once. `completion` is called exactly once, whatever happens to

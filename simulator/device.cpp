@@ -29,7 +29,7 @@ constexpr timespec kTimeToObey = {3, 0};
 sigset_t deviceSignals() {
   sigset_t signals;
   sigemptyset(&signals);
-  for (const int signalNumber : {SIGCHLD, SIGINT, SIGTERM, SIGHUP}) {
+  for (const int signalNumber : {SIGCHLD, SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     sigaddset(&signals, signalNumber);
   }
   return signals;
@@ -123,8 +123,9 @@ int Device::run(const std::vector<std::string>& command) {
     if (received < 0 && errno == EAGAIN) {
       kill(process, SIGKILL);
     }
-    // What the terminal sends for its interrupt key has reached the command already.
-    const bool fromTerminal = received == SIGINT && info.si_code == SI_KERNEL;
+    // What the terminal sends for its keys has reached the command already.
+    const bool fromTerminal =
+        (received == SIGINT || received == SIGQUIT) && info.si_code == SI_KERNEL;
     if (received > 0 && received != SIGCHLD && !fromTerminal) {
       kill(process, received);
       ending = true;

@@ -37,6 +37,7 @@ void* runShellThread(void* argument) {
 }  // namespace
 
 int main(int count, char* vector[]) {
+  openMissingStandardStreams();
   auto words = CommandShell::convertCmdArgsToList(count, vector);
   if (radioType() == 0) {
     std::cout << "'velltool' is not supported on this product." << std::endl;

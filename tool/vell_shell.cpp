@@ -9,6 +9,7 @@
 #include "tool/vell_command.h"
 
 #include <chrono>
+#include <iostream>
 #include <string>
 #include <utility>
 
@@ -34,7 +35,11 @@ void subscribeToServerState(const std::shared_ptr<vell::client::Manager>& manage
 }  // namespace
 
 std::shared_ptr<CommandBase> VellShell::createRootCommand() {
-  const WorkQueue queue(kQueueLabel);
+  const auto queue = WorkQueue::create(kQueueLabel);
+  if (!queue) {
+    std::cerr << "velltool: cannot start the work queue's thread" << std::endl;
+    return nullptr;
+  }
   const auto manager = vell::client::CreateManager(kClientName, queue);
   const auto group = WorkGroup::create();
   {

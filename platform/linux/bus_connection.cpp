@@ -1,7 +1,8 @@
 #include "platform/linux/bus_connection.h"
 
+#include "platform/linux/thread_name.h"
+
 #include <poll.h>
-#include <pthread.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -21,9 +22,6 @@ constexpr auto kGreetingPatience = 5s;
 /// How many messages are handled before new calls get their turn.
 constexpr int kMostStepsAtOnce = 64;
 
-/// See pthread_setname_np(3).
-constexpr std::size_t kLongestThreadName = 15;
-
 /// What sd_bus_call_async(3) takes for no time limit.
 constexpr std::uint64_t kNoTimeLimit = UINT64_MAX;
 
@@ -40,7 +38,7 @@ BusConnection::BusConnection(const std::string& threadName, Hooks connectionHook
   const std::lock_guard lock(mutex);
   try {
     thread = std::thread([this] { run(); });
-    pthread_setname_np(thread.native_handle(), threadName.substr(0, kLongestThreadName).c_str());
+    nameThread(thread, threadName);
   } catch (const std::system_error&) {
     // Without a thread this is a connection to no bus, for good.
   }
@@ -229,6 +227,10 @@ BusConnection::Clock::time_point BusConnection::wakeTime() const {
     return nextAttempt;
   }
   auto earliest = ready ? Clock::time_point::max() : greetingLimit;
+  if (wakeUp.descriptor() < 0) {
+    // Nobody can wake the thread, so that it looks around by itself.
+    earliest = std::min(earliest, Clock::now() + kRetryPause);
+  }
   std::uint64_t busLimit = UINT64_MAX;
   if (sd_bus_get_timeout(bus.get(), &busLimit) >= 0 && busLimit != UINT64_MAX) {
     const std::chrono::microseconds sinceBoot(busLimit);

@@ -50,7 +50,7 @@ class BusConnection {
     std::function<void()> lost;                  ///< It is gone; slots on it are to be released.
   };
 
-  /// Starts to connect. The first 15 bytes of `threadName` name the thread; either hook may be
+  /// Starts to connect. `threadName` is for people; either hook may be
   /// empty.
   BusConnection(const std::string& threadName, Hooks hooks);
   BusConnection(const BusConnection&) = delete;

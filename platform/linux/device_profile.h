@@ -14,7 +14,7 @@ struct DeviceProfile {
   CompressionMode defaultCompression = kCompressionNone;
   bool compressionSupported = true;
 
-  /// Takes the known keys out of `file`, and leaves the others alone. A value that cannot be read
+  /// Reads the known keys of `file`, and passes over the others. A value that cannot be read
   /// leaves the default, and a fault in `file`. From any thread.
   static DeviceProfile from(SettingsFile& file);
 };

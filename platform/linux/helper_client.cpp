@@ -1,6 +1,7 @@
 #include "platform/helper_client.h"
 
 #include "platform/helper_names.h"
+#include "platform/linux/bus_answer.h"
 #include "platform/linux/bus_connection.h"
 #include "platform/linux/bus_dictionary.h"
 
@@ -17,27 +18,18 @@ constexpr const char* kBusName = "org.vell.Helper1";
 constexpr const char* kObjectPath = "/org/vell/Helper1";
 constexpr const char* kInterface = "org.vell.Helper1";
 
-/// The status of a command that the bus, the helper's absence or the time limit kept from ending.
-constexpr std::int32_t kStatusNotPerformed = static_cast<std::int32_t>(0xE020E002U);
-
 /// So far ahead that no wait reaches it, and no addition to the present time overflows.
 constexpr std::int64_t kLongestWait = std::int64_t{1000} * 60 * 60 * 24 * 365;
 
-using Answer = std::pair<CommandResult, MessageDict>;
-
-Answer failure(const char* message) {
-  return {{kStatusNotPerformed, message}, MessageDict::notADictionary()};
-}
-
-Answer readAnswer(BusOutcome outcome, sd_bus_message* reply) {
+BusAnswer readAnswer(BusOutcome outcome, sd_bus_message* reply) {
   if (outcome != BusOutcome::answered) {
-    return failure("The helper did not answer");
+    return failedAnswer(kStatusBusFailure, "The helper did not answer");
   }
-  Answer answer;
+  BusAnswer answer;
   if (sd_bus_message_has_signature(reply, "iv") <= 0 ||
       sd_bus_message_read(reply, "i", &answer.first.status) <= 0 ||
       !readPayload(reply, answer.second)) {
-    return failure("The helper's answer has the wrong signature");
+    return failedAnswer(kStatusBusFailure, "The helper's answer has the wrong signature");
   }
   if (answer.first.status != 0) {
     answer.second = MessageDict::notADictionary();
@@ -62,9 +54,9 @@ class vell::HelperClient::Connection {
  public:
   explicit Connection(const char* name) : bus(name, {}) {}
 
-  std::future<Answer> perform(helper::TaskID task, const char* command,
-                              const MessageDict& request) {
-    const auto promise = std::make_shared<std::promise<Answer>>();
+  std::future<BusAnswer> perform(helper::TaskID task, const char* command,
+                                 const MessageDict& request) {
+    const auto promise = std::make_shared<std::promise<BusAnswer>>();
     bus.call({kBusName, kObjectPath, kInterface, "Perform",
               [task, command = std::string(command), request](sd_bus_message* message) {
                 return sd_bus_message_append(message, "u", task) >= 0 &&
@@ -96,7 +88,7 @@ CommandResult vell::HelperClient::perform(helper::TaskID task, const char* comma
   auto answered = connection->perform(task, command, request);
   if (answered.wait_for(patience) != std::future_status::ready) {
     reply = MessageDict::notADictionary();
-    return {kStatusNotPerformed, "The helper did not answer in time"};
+    return {kStatusBusFailure, "The helper did not answer in time"};
   }
   auto [result, payload] = answered.get();
   reply = std::move(payload);

@@ -1,11 +1,11 @@
 #include "platform/manager_client.h"
 
+#include "platform/linux/bus_answer.h"
 #include "platform/linux/bus_connection.h"
 #include "platform/linux/bus_dictionary.h"
 #include "platform/linux/saved_traces.h"
 #include "platform/manager_names.h"
 
-#include <atomic>
 #include <future>
 #include <map>
 #include <mutex>
@@ -20,42 +20,32 @@ constexpr const char* kInterface = "org.vell.Manager1";
 /// The state that is delivered while no manager runs.
 constexpr const char* kServerStateStopped = "Stopped";
 
-/// The status of a command that the bus failed, other than by finding no manager.
-constexpr std::int32_t kStatusBusFailure = static_cast<std::int32_t>(0xE020E002U);
-
 BusCall managerCall(const char* interface, const char* member,
                     std::function<bool(sd_bus_message*)> fill) {
   return {kBusName, kObjectPath, interface, member, std::move(fill)};
 }
 
-using Answer = std::pair<CommandResult, MessageDict>;
-
-/// What a command that was not carried out is answered with.
-Answer failure(std::int32_t status, const char* message) {
-  return {{status, message}, MessageDict::notADictionary()};
-}
-
-Answer readAnswer(sd_bus_message* reply) {
+BusAnswer readAnswer(sd_bus_message* reply) {
   const char* message = nullptr;
   CommandResult result;
   MessageDict payload;
   if (sd_bus_message_has_signature(reply, "isv") <= 0 ||
       sd_bus_message_read(reply, "is", &result.status, &message) <= 0 ||
       !readPayload(reply, payload)) {
-    return failure(kStatusBusFailure, "The manager's answer has the wrong signature");
+    return failedAnswer(kStatusBusFailure, "The manager's answer has the wrong signature");
   }
   result.message = message;
   return {std::move(result), std::move(payload)};
 }
 
 /// What stands in for the manager's answer while it does not run.
-Answer answerWithoutManager(const std::string& command, const MessageDict& request) {
+BusAnswer answerWithoutManager(const std::string& command, const MessageDict& request) {
   const auto saved = command == vell::kCommandGetTraceProperty
                          ? savedTraceProperty(request.getString(vell::kKeyTraceName),
                                               request.getString(vell::kKeyTracePropertyName))
                          : std::nullopt;
   if (!saved) {
-    return failure(vell::kStatusManagerNotRunning, "The manager is not running");
+    return failedAnswer(vell::kStatusManagerNotRunning, "The manager is not running");
   }
   MessageDict reply;
   reply.set(vell::kKeyTracePropertyValue, *saved);
@@ -92,15 +82,19 @@ class Subscriptions {
 
   void switchOn() {
     const std::lock_guard lock(mutex);
-    on = std::make_shared<std::atomic<bool>>(true);
+    on = std::make_shared<Delivery>();
   }
 
   void switchOff() {
-    const std::lock_guard lock(mutex);
-    if (on) {
-      on->store(false);
+    std::shared_ptr<Delivery> ended;
+    {
+      const std::lock_guard lock(mutex);
+      ended.swap(on);
     }
-    on.reset();
+    if (ended) {
+      const std::lock_guard lock(ended->mutex);
+      ended->on = false;
+    }
   }
 
   bool areOn() const {
@@ -115,19 +109,26 @@ class Subscriptions {
       return;
     }
     // Asked again on the queue: delivery may have been switched off while the event waited there.
-    queue.submit([stillOn = on, handler = found->second, event = std::move(payload)] {
-      if (*stillOn) {
+    queue.submit([delivery = on, handler = found->second, event = std::move(payload)] {
+      const std::lock_guard handling(delivery->mutex);
+      if (delivery->on) {
         (*handler)(event, WorkGroup::create());
       }
     });
   }
 
  private:
+  /// One stretch of time in which events are delivered.
+  struct Delivery {
+    std::recursive_mutex mutex;  // held while a handler runs, which may itself end the delivery
+    bool on = true;              // guarded by mutex
+  };
+
   const WorkQueue queue;
   mutable std::mutex mutex;
   std::map<std::string, std::shared_ptr<const vell::client::EventHandler>>
-      handlers;                           // guarded by mutex
-  std::shared_ptr<std::atomic<bool>> on;  // guarded by mutex; empty while delivery is off
+      handlers;                  // guarded by mutex
+  std::shared_ptr<Delivery> on;  // guarded by mutex; empty while delivery is off
 };
 
 }  // namespace
@@ -135,14 +136,14 @@ class Subscriptions {
 class vell::client::Manager {
  public:
   Manager(std::string name, WorkQueue workQueue)
-      : clientName(std::move(name)),
-        queue(workQueue),
+      : queue(workQueue),
         subscriptions(std::move(workQueue)),
+        clientName(std::move(name)),
         connection("manager.client",
                    {[this](sd_bus* bus) { onConnected(bus); }, [this] { onLost(); }}) {}
 
   void perform(const std::string& command, const MessageDict& request,
-               std::function<void(Answer)> handler) {
+               std::function<void(BusAnswer)> handler) {
     connection.call(managerCall(kInterface, "PerformCommand",
                                 [command, request](sd_bus_message* message) {
                                   return appendText(message, command) &&
@@ -156,7 +157,7 @@ class vell::client::Manager {
                         case BusOutcome::noOwner:
                           return handler(answerWithoutManager(command, request));
                         case BusOutcome::failed:
-                          return handler(failure(kStatusBusFailure, "The bus failed"));
+                          return handler(failedAnswer(kStatusBusFailure, "The bus failed"));
                       }
                     });
   }
@@ -166,7 +167,6 @@ class vell::client::Manager {
     connection.post([this] { deliverState(); });
   }
 
-  const std::string clientName;
   const WorkQueue queue;
   Subscriptions subscriptions;
 
@@ -247,6 +247,7 @@ class vell::client::Manager {
     return 0;
   }
 
+  const std::string clientName;
   bool stateTold = false;  // so that a new connection makes it worth telling anew
   BusSlotPtr events;
   BusSlotPtr ownerChanges;
@@ -275,21 +276,23 @@ void vell::client::EventsOff(std::shared_ptr<Manager> manager) {
 
 void vell::client::PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
                                   Completion completion, MessageDict request) {
-  manager->perform(command, request,
-                   [queue = manager->queue, completion = std::move(completion)](Answer answer) {
-                     queue.submit([completion, answer = std::move(answer)] {
-                       completion(answer.first, answer.second);
-                     });
-                   });
+  manager->perform(
+      command, request,
+      [queue = manager->queue, completion = std::move(completion)](BusAnswer answer) mutable {
+        // Moved on, so that its last copy is released where it runs.
+        queue.submit([completion = std::move(completion), answer = std::move(answer)] {
+          completion(answer.first, answer.second);
+        });
+      });
 }
 
 CommandResult vell::client::PerformCommand(std::shared_ptr<Manager> manager,
                                            const std::string& command, MessageDict request,
                                            MessageDict* reply) {
-  const auto answered = std::make_shared<std::promise<Answer>>();
+  const auto answered = std::make_shared<std::promise<BusAnswer>>();
   auto answer = answered->get_future();
   manager->perform(command, request,
-                   [answered](Answer given) { answered->set_value(std::move(given)); });
+                   [answered](BusAnswer given) { answered->set_value(std::move(given)); });
   auto [result, payload] = answer.get();
   *reply = std::move(payload);
   return result;

@@ -6,11 +6,18 @@
 #include <iterator>
 #include <sstream>
 #include <string_view>
+#include <system_error>
 #include <utility>
 
 namespace {
 
 constexpr const char* kBlanks = " \t\r\v\f";
+
+/// What a backslash takes the meaning of within double quotes, as in the shell.
+constexpr std::string_view kEscaped = "\"\\$`";
+
+/// What stands for itself only within quotes.
+constexpr std::string_view kNeedsQuotes = "\"'\\ \t$`;&|<>()*?[]#~";
 
 std::string_view trim(std::string_view text) {
   const auto first = text.find_first_not_of(kBlanks);
@@ -34,7 +41,8 @@ std::optional<std::string> unquote(std::string_view text, char quote) {
     if (character == quote) {
       return at + 1 == text.size() ? std::optional(value) : std::nullopt;
     }
-    const bool escapes = quote == '"' && character == '\\' && at + 1 < text.size();
+    const bool escapes = quote == '"' && character == '\\' && at + 1 < text.size() &&
+                         kEscaped.find(text[at + 1]) != std::string_view::npos;
     value += escapes ? text[++at] : character;
   }
   return std::nullopt;
@@ -44,7 +52,7 @@ std::optional<std::string> readValue(std::string_view text) {
   if (!text.empty() && (text.front() == '"' || text.front() == '\'')) {
     return unquote(text, text.front());
   }
-  if (text.find_first_of("\"'\\ \t") != std::string_view::npos) {
+  if (text.find_first_of(kNeedsQuotes) != std::string_view::npos) {
     return std::nullopt;
   }
   return std::string(text);
@@ -64,6 +72,7 @@ void parseLine(std::string_view text, int line, SettingsFile& file) {
   auto value = readValue(text.substr(equals + 1));
   if (!value) {
     file.faults.push_back({line, std::string(key) + ": value is not quoted as it must be"});
+    file.settings.erase(std::string(key));
     return;
   }
   file.settings[std::string(key)] = {*std::move(value), line};
@@ -82,21 +91,29 @@ SettingsFile SettingsFile::parse(const std::string& text) {
 }
 
 std::optional<SettingsFile> SettingsFile::read(const std::filesystem::path& path) {
-  const auto unreadable = [](int error) {
+  const auto unreadable = [](const char* why) {
     SettingsFile file;
-    file.faults.push_back({0, std::strerror(error)});
+    file.faults.push_back({0, why});
     return file;
   };
-  // A folder opens like a file and fails only when it is read.
+  std::error_code error;
+  const auto status = std::filesystem::status(path, error);
+  if (status.type() == std::filesystem::file_type::not_found) {
+    return std::nullopt;
+  }
+  // Anything else than a file might never come to its end.
+  if (std::filesystem::exists(status) && !std::filesystem::is_regular_file(status)) {
+    return unreadable("not a file");
+  }
   std::ifstream stream(path, std::ios::binary);
   if (!stream) {
-    return errno == ENOENT ? std::nullopt : std::optional(unreadable(errno));
+    return unreadable(std::strerror(errno));
   }
   std::ostringstream text;
   errno = 0;
   text << stream.rdbuf();
   if (errno != 0) {
-    return unreadable(errno);
+    return unreadable(std::strerror(errno));
   }
   return parse(text.str());
 }

@@ -14,7 +14,7 @@ struct Setting {
 
 /// A settings file, in the syntax of os-release(5): `KEY=value` lines, blank lines, lines that
 /// start with `#`; a value may stand in single quotes, or in double quotes with backslash escapes.
-/// Keys may hold points as well. A later line for a key counts before an earlier one.
+/// Keys may hold points as well. The last line for a key counts, be it that it cannot be read.
 struct SettingsFile {
   /// One thing that could not be read.
   struct Fault {

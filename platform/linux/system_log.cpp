@@ -14,6 +14,7 @@
 #include <syslog.h>
 #include <systemd/sd-journal.h>
 
+#include <atomic>
 #include <cerrno>
 #include <cstdint>
 #include <cstdio>
@@ -67,14 +68,18 @@ void sendToSocketIn(const std::filesystem::path& directory, const std::string& d
   if (!folder || !sender) {
     return;
   }
-  // A listener that has stopped reading must not stop the tool.
+  // A listener that has stopped reading must not stop the tool, and is waited for only once.
+  static std::atomic<bool> stuck = false;
   const timeval patience{1, 0};
   setsockopt(sender.get(), SOL_SOCKET, SO_SNDTIMEO, &patience, sizeof patience);
   sockaddr_un address{};
   address.sun_family = AF_UNIX;
   std::snprintf(address.sun_path, sizeof address.sun_path, "/proc/self/fd/%d/socket", folder.get());
-  sendto(sender.get(), datagram.data(), datagram.size(), MSG_NOSIGNAL,
-         reinterpret_cast<const sockaddr*>(&address), sizeof address);
+  const int waiting = stuck ? MSG_DONTWAIT : 0;
+  if (sendto(sender.get(), datagram.data(), datagram.size(), MSG_NOSIGNAL | waiting,
+             reinterpret_cast<const sockaddr*>(&address), sizeof address) < 0) {
+    stuck = errno == EAGAIN;
+  }
 }
 
 }  // namespace

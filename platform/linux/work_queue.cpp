@@ -1,10 +1,12 @@
 #include "platform/work_queue.h"
 
-#include <pthread.h>
+#include "platform/linux/thread_name.h"
 
 #include <condition_variable>
 #include <deque>
 #include <mutex>
+#include <optional>
+#include <system_error>
 #include <thread>
 #include <utility>
 
@@ -19,11 +21,12 @@ struct Backlog {
   bool closed = false;                        // guarded by mutex
 };
 
-std::function<void()> takeNext(Backlog& backlog) {
+/// The next closure, waited for; none once the queue is closed and has run everything.
+std::optional<std::function<void()>> takeNext(Backlog& backlog) {
   std::unique_lock lock(backlog.mutex);
   backlog.changed.wait(lock, [&] { return backlog.closed || !backlog.waiting.empty(); });
   if (backlog.waiting.empty()) {
-    return nullptr;
+    return std::nullopt;
   }
   auto next = std::move(backlog.waiting.front());
   backlog.waiting.pop_front();
@@ -32,11 +35,9 @@ std::function<void()> takeNext(Backlog& backlog) {
 
 void runUntilClosed(const std::shared_ptr<Backlog>& backlog) {
   while (const auto work = takeNext(*backlog)) {
-    work();
+    (*work)();
   }
 }
-
-constexpr std::size_t kLongestThreadName = 15;
 
 }  // namespace
 
@@ -44,7 +45,7 @@ class WorkQueue::Worker {
  public:
   explicit Worker(std::string queueLabel)
       : label(std::move(queueLabel)), thread(runUntilClosed, backlog) {
-    pthread_setname_np(thread.native_handle(), label.substr(0, kLongestThreadName).c_str());
+    nameThread(thread, label);
   }
 
   Worker(const Worker&) = delete;
@@ -70,16 +71,26 @@ class WorkQueue::Worker {
   std::thread thread;
 };
 
-WorkQueue::WorkQueue(std::string label) : worker(std::make_shared<Worker>(std::move(label))) {}
+WorkQueue WorkQueue::create(std::string label) {
+  WorkQueue queue;
+  try {
+    queue.worker = std::make_shared<Worker>(std::move(label));
+  } catch (const std::system_error&) {
+    // The handle stays absent, which is how the caller learns of it.
+  }
+  return queue;
+}
 
 const std::string& WorkQueue::label() const {
   return worker->label;
 }
 
 void WorkQueue::submit(std::function<void()> work) const {
+  // The closure may release this very handle, as soon as it is in.
+  const auto backlog = worker->backlog;
   {
-    const std::lock_guard lock(worker->backlog->mutex);
-    worker->backlog->waiting.push_back(std::move(work));
+    const std::lock_guard lock(backlog->mutex);
+    backlog->waiting.push_back(std::move(work));
   }
-  worker->backlog->changed.notify_one();
+  backlog->changed.notify_one();
 }

@@ -228,5 +228,5 @@ TEST(SavedTraces, CountAsNoneWhenTheyCannotBeRead) {
 
   std::filesystem::create_directory(settings);
   EXPECT_EQ(device.runTool({"logdump", "bb"}), notFound);
-  EXPECT_EQ(log.messages(), Lines{settings.string() + ": Is a directory"});
+  EXPECT_EQ(log.messages(), Lines{settings.string() + ": not a file"});
 }

@@ -140,7 +140,7 @@ TEST(StartUp, ReportsWhatIsWrongWithTheProfileAndGoesOn) {
   std::filesystem::remove(profile);
   std::filesystem::create_directory(profile);
   EXPECT_EQ(device.runTool({"help"}), kNoRadio);
-  EXPECT_EQ(log.messages(), std::vector<std::string>{profile.string() + ": Is a directory"});
+  EXPECT_EQ(log.messages(), std::vector<std::string>{profile.string() + ": not a file"});
 }
 
 TEST(StartUp, SaysWhyTheShellThreadCannotBeStarted) {

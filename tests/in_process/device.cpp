@@ -19,16 +19,6 @@ std::unique_ptr<in_process::Device>& present() {
 
 }  // namespace
 
-void in_process::Device::record(Request request) {
-  const std::lock_guard lock(mutex);
-  received.push_back(std::move(request));
-}
-
-std::vector<in_process::Request> in_process::Device::requests() {
-  const std::lock_guard lock(mutex);
-  return received;
-}
-
 in_process::Device& in_process::device() {
   return *present();
 }
@@ -97,8 +87,7 @@ std::shared_ptr<vell::HelperClient> vell::HelperClient::create(
 }
 
 CommandResult vell::HelperClient::perform(helper::TaskID /*task*/, const char* command,
-                                          MessageDict request, MessageDict& reply) {
-  in_process::device().record({command, request});
+                                          MessageDict /*request*/, MessageDict& reply) {
   const auto answer = in_process::device().model.performHelperCommand(command);
   reply = answer.reply;
   return {answer.status, answer.message};

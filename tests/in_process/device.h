@@ -4,21 +4,11 @@
 #include "platform/message_dict.h"
 #include "simulator/device_model.h"
 
-#include <mutex>
-#include <optional>
 #include <string>
 #include <vector>
 
 /// The device behind the in-process platform: the tests' own side of every service.
 namespace in_process {
-
-/// One request, as the manager or the helper received it.
-struct Request {
-  std::string command;
-  MessageDict arguments;
-
-  friend bool operator==(const Request&, const Request&) = default;
-};
 
 /// What a test sets before it acts, and reads after it has acted.
 struct Device {
@@ -26,15 +16,7 @@ struct Device {
   DeviceProfile profile;
   bool managerRuns = true;
   std::string programName = "velltool";
-  std::vector<std::string> clientNames;  ///< Of each client of the manager that was opened.
-  std::vector<std::string> queueLabels;  ///< Of the queue that each of them was handed.
-
-  void record(Request request);
-  std::vector<Request> requests();
-
- private:
-  std::mutex mutex;
-  std::vector<Request> received;  // guarded by mutex
+  std::vector<std::string> clientCalls;  ///< What was done to the client of the manager.
 };
 
 /// The device there is.

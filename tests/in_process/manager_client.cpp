@@ -56,13 +56,16 @@ Clients& clients() {
   return present;
 }
 
+void noteCall(const std::string& call) {
+  in_process::device().clientCalls.push_back(call);
+}
+
 std::pair<CommandResult, MessageDict> answerTo(const std::string& command,
                                                const MessageDict& request) {
-  auto& device = in_process::device();
+  const auto& device = in_process::device();
   if (!device.managerRuns) {
     return {{vell::kStatusManagerNotRunning, ""}, MessageDict::notADictionary()};
   }
-  device.record({command, request});
   auto answer = device.model.performCommand(command, request);
   if (answer.conduct != simulator::Conduct::Reply) {
     return {{kStatusBusFailure, ""}, MessageDict::notADictionary()};
@@ -84,17 +87,18 @@ void in_process::sendEvent(const std::string& name, const MessageDict& payload) 
 
 std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::string& clientName,
                                                                    WorkQueue queue) {
-  in_process::device().clientNames.push_back(clientName);
-  in_process::device().queueLabels.push_back(queue.label());
+  noteCall("CreateManager " + clientName + " " + queue.label());
   return clients().opened.emplace_back(std::make_shared<Manager>(std::move(queue)));
 }
 
 void vell::client::RegisterEventHandler(std::shared_ptr<Manager> manager,
                                         const std::string& eventName, EventHandler handler) {
+  noteCall("RegisterEventHandler " + eventName);
   manager->handlers[eventName] = std::move(handler);
 }
 
 void vell::client::EventsOn(std::shared_ptr<Manager> manager) {
+  noteCall("EventsOn");
   manager->on = true;
   MessageDict stopped;
   stopped.set(kKeyServerState, "Stopped");
@@ -104,6 +108,7 @@ void vell::client::EventsOn(std::shared_ptr<Manager> manager) {
 }
 
 void vell::client::EventsOff(std::shared_ptr<Manager> manager) {
+  noteCall("EventsOff");
   manager->on = false;
 }
 

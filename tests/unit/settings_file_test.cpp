@@ -56,7 +56,7 @@ TEST(SettingsFile, TellsAMissingFileFromAnUnreadableOne) {
   EXPECT_FALSE(SettingsFile::read(folder + "/missing").has_value());
   const auto unreadable = SettingsFile::read(folder);
   ASSERT_TRUE(unreadable.has_value());
-  EXPECT_EQ(describe(*unreadable), "!0:Is a directory ");
+  EXPECT_EQ(describe(*unreadable), "!0:not a file ");
   std::ofstream(folder + "/there") << "A=1";
   EXPECT_EQ(describe(*SettingsFile::read(folder + "/there")), "1:A=[1] ");
   std::filesystem::remove_all(folder);

@@ -12,7 +12,7 @@ namespace {
 
 bool isModeThree(const std::string& value) {
   in_process::startDevice("SystemLogs.TraceMode='" + value + "'");
-  const WorkQueue queue("test");
+  const auto queue = WorkQueue::create("test");
   const auto manager = vell::client::CreateManager("test", queue);
   const auto node = LogdumpCommand::create("logdump", {}, manager, queue);
   return isSystemLogsTraceModeThree(dynamic_cast<LogdumpCommand&>(*node));

@@ -10,7 +10,7 @@ TEST(WorkQueue, RunsEverythingInOrderBeforeItsLastHandleGoes) {
   std::string log;
   {
     std::promise<void> gate;
-    std::optional<WorkQueue> queue("test");
+    auto queue = std::make_optional(WorkQueue::create("test"));
     queue->submit([&] { gate.get_future().wait(); });
     for (const char letter : {'a', 'b', 'c'}) {
       queue->submit([&log, letter] { log += letter; });
@@ -24,7 +24,7 @@ TEST(WorkQueue, RunsEverythingInOrderBeforeItsLastHandleGoes) {
 }
 
 TEST(WorkQueue, ReleasesAClosureAsSoonAsItHasRun) {
-  const WorkQueue queue("test");
+  const auto queue = WorkQueue::create("test");
   auto token = std::make_shared<int>();
   const std::weak_ptr<int> watch = token;
   queue.submit([held = std::move(token)] {});
@@ -36,7 +36,7 @@ TEST(WorkQueue, ReleasesAClosureAsSoonAsItHasRun) {
 TEST(WorkQueue, MayLoseItsLastHandleOnItsOwnThread) {
   std::promise<void> done;
   {
-    auto queue = std::make_unique<WorkQueue>("test");
+    auto queue = std::make_unique<WorkQueue>(WorkQueue::create("test"));
     auto* const raw = queue.get();
     raw->submit([held = std::shared_ptr<WorkQueue>(std::move(queue)), &done] {
       held->submit([&done] { done.set_value(); });
