@@ -61,9 +61,8 @@ JournalFileScan::JournalFileScan(JournalFile file, LogTime from)
 void JournalFileScan::start(const LogSelection& selection) {
   started = true;
   damaged = !isTailReadable();
-  if (!selection.isEverything() && !useIndex(selection)) {
-    close(true);
-  } else if (findEnd() && endRealtime >= earliest && seekStart()) {
+  const bool mayHaveAny = selection.isEverything() || useIndex(selection);
+  if (mayHaveAny && findEnd() && endRealtime >= earliest && seekStart()) {
     advance();
   } else {
     close(true);

@@ -44,8 +44,9 @@ std::string exportFormat(const std::vector<StoredEntry>& entries) {
   std::string text;
   for (const auto& entry : entries) {
     const auto time = std::to_string(entry.realtime);
-    text += "__REALTIME_TIMESTAMP=" + time + "\n__MONOTONIC_TIMESTAMP=" + time +
-            "\n_BOOT_ID=4f1c3c3a4c0d4e2b9a0b7c6d5e4f3a2b\n";
+    text.append("__REALTIME_TIMESTAMP=").append(time);
+    text.append("\n__MONOTONIC_TIMESTAMP=").append(time);
+    text.append("\n_BOOT_ID=4f1c3c3a4c0d4e2b9a0b7c6d5e4f3a2b\n");
     for (const auto& [name, value] : entry.fields) {
       appendField(text, name, value);
     }

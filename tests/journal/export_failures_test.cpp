@@ -18,6 +18,8 @@ namespace fs = std::filesystem;
 const std::string kLine =
     "2021-05-04 13:07:21 +0000 0x00000 0x0 0 (null)((null)):(null) [(null)] m\n";
 
+const std::string kThreeLines = kLine + kLine + kLine;
+
 std::vector<StoredEntry> entries(std::size_t count) {
   return std::vector<StoredEntry>(count, {1'620'133'641'000'000, {{"MESSAGE", "m"}}});
 }
@@ -164,7 +166,7 @@ TEST(ExportFailures, TellWhatTheFileIsNotFitFor) {
     EXPECT_EQ(result.status, each.status);
     EXPECT_EQ(result.messages, messages);
     if (fs::is_regular_file(device.output())) {
-      EXPECT_EQ(result.content, kLine + kLine + kLine);
+      EXPECT_EQ(result.content, kThreeLines);
     }
   }
 }

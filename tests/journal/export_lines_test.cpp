@@ -9,7 +9,11 @@
 
 namespace {
 
-using std::literals::operator""s;
+/// All the bytes of a literal, NUL included.
+template <std::size_t Size>
+std::string bytes(const char (&literal)[Size]) {
+  return {literal, Size - 1};
+}
 
 constexpr std::uint64_t kTime = 1'620'133'641'999'999;  // 2021-05-04 13:07:21 UTC
 const std::string kShownTime = "2021-05-04 13:07:21 +0000";
@@ -64,8 +68,8 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
       {{{"MESSAGE", "empty"}, {"_EXE", ""}, {"VELL_SUBSYSTEM", ""}, {"VELL_CATEGORY", ""}},
        kShownTime + " 0x00000 0x0 0 (): [] empty\n"},
       {{{"MESSAGE", ""}}, kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] \n"},
-      {{{"MESSAGE", "a\nb\n\n50%d %s \0 c"s}},
-       kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] a\nb\n\n50%d %s \0 c\n"s},
+      {{{"MESSAGE", bytes("a\nb\n\n50%d %s \0 c")}},
+       kShownTime + bytes(" 0x00000 0x0 0 (null)((null)):(null) [(null)] a\nb\n\n50%d %s \0 c\n")},
       {{{"MESSAGE", longText + "end"}},
        kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] " + longText + "end\n"},
       {{{"MESSAGE", "ä\x80 \xE2\x82 \xED\xA0\x80 \xF0\x9F\x93"},

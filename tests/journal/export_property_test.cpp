@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <iterator>
 #include <optional>
 #include <random>
 #include <string>
@@ -198,9 +199,8 @@ TEST(ExportProperty, IsWhatAPlainFilterGives) {
     const auto files = makeFiles(chance);
     for (std::size_t file = 0; file < files.size(); ++file) {
       std::vector<StoredEntry> stored;
-      for (const auto& entry : files[file]) {
-        stored.push_back(entry.stored);
-      }
+      std::transform(files[file].begin(), files[file].end(), std::back_inserter(stored),
+                     [](const ModelEntry& entry) { return entry.stored; });
       device.store((file == 0 ? "system" : "user-" + std::to_string(file)) + ".journal", stored);
     }
     for (int selections = 0; selections < 15; ++selections) {

@@ -101,9 +101,10 @@ TEST(ExportSelection, GivesTheOldestFirstAcrossFiles) {
 }
 
 TEST(ExportSelection, StartsAtTheHistory) {
-  using namespace std::chrono;
-  const auto now = static_cast<std::uint64_t>(
-      duration_cast<microseconds>(system_clock::now().time_since_epoch()).count());
+  const auto now =
+      static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::microseconds>(
+                                     std::chrono::system_clock::now().time_since_epoch())
+                                     .count());
   constexpr std::uint64_t kMinute = 60'000'000;
   DeviceJournal device;
   device.store("system.journal",

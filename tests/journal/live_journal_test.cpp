@@ -65,7 +65,8 @@ class HeldUpExport {
     return end;
   }
 
-  TestProcess start(const DeviceJournal& device, std::vector<std::string> selection) const {
+  [[nodiscard]] TestProcess start(const DeviceJournal& device,
+                                  std::vector<std::string> selection) const {
     selection.insert(selection.begin(), {kAllOfHistory, path});
     return TestProcess(device.exporting(selection));
   }
