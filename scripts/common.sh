@@ -3,9 +3,9 @@
 set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")/.."
 
-build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev libgtest-dev)
+build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev)
 run_packages=(dbus-daemon systemd-journal-remote)
-check_packages=(clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev)
+check_packages=(libgtest-dev clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev)
 
 say() {
   printf '\n== %s\n' "$*"

@@ -59,7 +59,7 @@ BusConnection::~BusConnection() {
 
 void BusConnection::call(BusCall call, ReplyHandler handler) {
   post([this, call = std::move(call), handler = std::move(handler)]() mutable {
-    send(call, std::move(handler));
+    accept(std::move(call), std::move(handler));
   });
 }
 
@@ -112,20 +112,30 @@ void BusConnection::connect() {
   bus.reset(opened);
   ready = false;
   greetingLimit = Clock::now() + kGreetingPatience;
-  if (hooks.connected) {
-    hooks.connected(opened);
-  }
 }
 
 void BusConnection::process() {
   int progress = bus ? 1 : 0;
   for (int step = 0; progress > 0 && step < kMostStepsAtOnce; ++step) {
     progress = sd_bus_process(bus.get(), nullptr);
-    ready = ready || sd_bus_is_ready(bus.get()) > 0;
+    if (!ready && sd_bus_is_ready(bus.get()) > 0) {
+      becomeReady();
+    }
   }
   const bool greetingFailed = bus && !ready && Clock::now() >= greetingLimit;
   if (progress < 0 || greetingFailed || (bus && sd_bus_is_open(bus.get()) <= 0)) {
     drop();
+  }
+}
+
+void BusConnection::becomeReady() {
+  ready = true;
+  distrusted = false;
+  if (hooks.connected) {
+    hooks.connected(bus.get());
+  }
+  for (auto& waiting : std::exchange(waitingCalls, {})) {
+    send(waiting.call, std::move(waiting.handler));
   }
 }
 
@@ -134,29 +144,41 @@ void BusConnection::drop() {
   if (!bus) {
     return;
   }
-  if (hooks.lost) {
+  if (ready && hooks.lost) {
     hooks.lost();
   }
-  const auto outcome = ready ? BusOutcome::failed : BusOutcome::noOwner;
+  distrusted = !ready;
+  ready = false;
+  const auto unsent = std::exchange(waitingCalls, {});
   auto unanswered = std::exchange(pendingCalls, {});
   for (auto& pending : unanswered) {
     pending.slot.reset();
   }
   bus.reset();
   nextAttempt = Clock::now() + kRetryPause;
-  for (auto& pending : unanswered) {
-    pending.handler(outcome, nullptr);
+  for (const auto& waiting : unsent) {
+    waiting.handler(BusOutcome::noOwner, nullptr);
+  }
+  for (const auto& pending : unanswered) {
+    pending.handler(BusOutcome::failed, nullptr);
+  }
+}
+
+/// Sends a call now, or once the bus has greeted, or answers it when there is no bus.
+void BusConnection::accept(BusCall call, ReplyHandler handler) {
+  if (!bus && thread.joinable()) {
+    connect();
+  }
+  if (ready) {
+    send(call, std::move(handler));
+  } else if (bus && !distrusted) {
+    waitingCalls.push_back({std::move(call), std::move(handler)});
+  } else {
+    handler(BusOutcome::noOwner, nullptr);
   }
 }
 
 void BusConnection::send(const BusCall& call, ReplyHandler handler) {
-  if (!bus && thread.joinable()) {
-    connect();
-  }
-  if (!bus) {
-    handler(BusOutcome::noOwner, nullptr);
-    return;
-  }
   auto& pending = pendingCalls.emplace_back(Pending{this, std::move(handler), nullptr});
   if (!sendTo(bus.get(), call, pending)) {
     const auto unsent = std::move(pending.handler);
@@ -197,7 +219,7 @@ void BusConnection::finish(std::list<Pending>::iterator pending, sd_bus_message*
   if (sd_bus_message_is_method_error(reply, nullptr) <= 0) {
     handler(BusOutcome::answered, reply);
   } else {
-    handler(!ready || meansNoOwner(reply) ? BusOutcome::noOwner : BusOutcome::failed, nullptr);
+    handler(meansNoOwner(reply) ? BusOutcome::noOwner : BusOutcome::failed, nullptr);
   }
 }
 

@@ -35,7 +35,9 @@ enum class BusOutcome {
 /// A connection to the system bus, kept up by a thread of its own, which alone touches it.
 ///
 /// The connection is made at once and, when it cannot be made or is lost, again and again until it
-/// can: at each call and a few times a second. See sd_bus_open_system(3) for which bus it is.
+/// can: at each call and a few times a second. A bus that is slow to greet is waited for once;
+/// after that it counts as no bus until it does greet. See sd_bus_open_system(3) for which bus it
+/// is.
 class BusConnection {
  public:
   /// Receives the end of one call, on the connection's thread. `reply` is null unless the outcome
@@ -44,7 +46,7 @@ class BusConnection {
 
   /// What happens to the connection as a whole, told on its thread.
   struct Hooks {
-    std::function<void(sd_bus* bus)> connected;  ///< A new connection is there to be used.
+    std::function<void(sd_bus* bus)> connected;  ///< A new connection is ready, before any call.
     std::function<void()> lost;                  ///< It is gone; slots on it are to be released.
   };
 
@@ -68,6 +70,12 @@ class BusConnection {
  private:
   using Clock = std::chrono::steady_clock;
 
+  /// A call that is to be sent as soon as the bus has greeted.
+  struct Waiting {
+    BusCall call;
+    ReplyHandler handler;
+  };
+
   /// A call that was sent and is not answered yet.
   struct Pending {
     BusConnection* connection;
@@ -82,6 +90,8 @@ class BusConnection {
   void connect();
   void process();
   void drop();
+  void becomeReady();
+  void accept(BusCall call, ReplyHandler handler);
   void send(const BusCall& call, ReplyHandler handler);
   [[nodiscard]] bool sendTo(sd_bus* target, const BusCall& call, Pending& pending);
   void finish(std::list<Pending>::iterator pending, sd_bus_message* reply);
@@ -93,9 +103,11 @@ class BusConnection {
 
   // Of the connection's thread alone.
   BusPtr bus;
-  bool ready = false;  // the bus has answered the greeting
+  bool ready = false;       // the bus has greeted
+  bool distrusted = false;  // the last connection was never greeted
   Clock::time_point greetingLimit;
   Clock::time_point nextAttempt;
+  std::vector<Waiting> waitingCalls;
   std::list<Pending> pendingCalls;
 
   std::mutex mutex;

@@ -188,10 +188,9 @@ class vell::client::Manager {
       ownerChanges.reset(slot);
     }
     greet();
-    if (connectedBefore) {
+    if (stateTold) {
       deliverState();
     }
-    connectedBefore = true;
   }
 
   void onLost() {
@@ -219,6 +218,7 @@ class vell::client::Manager {
                     }),
         [this](BusOutcome outcome, sd_bus_message* reply) {
           subscriptions.deliver(kEventServerStateChange, stateEvent(readState(outcome, reply)));
+          stateTold = true;
         });
   }
 
@@ -247,7 +247,7 @@ class vell::client::Manager {
     return 0;
   }
 
-  bool connectedBefore = false;
+  bool stateTold = false;  // so that a new connection makes it worth telling anew
   BusSlotPtr events;
   BusSlotPtr ownerChanges;
 

@@ -6,6 +6,7 @@
 
 #include <map>
 #include <optional>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -24,6 +25,11 @@ struct ProcessResult {
   std::string errors;
 
   friend bool operator==(const ProcessResult&, const ProcessResult&) = default;
+  friend std::ostream& operator<<(std::ostream& stream, const ProcessResult& result) {
+    return stream << "status " << result.status << "\noutput:\n"
+                  << result.output << "errors:\n"
+                  << result.errors;
+  }
 };
 
 /// A process whose standard streams the test holds: pipes, or a terminal and a pipe for standard
