@@ -22,6 +22,7 @@ endfunction()
 
 vell_find_module(SYSTEMD libsystemd libsystemd-dev)
 vell_find_module(UTF8PROC libutf8proc libutf8proc-dev)
+vell_find_program(JOURNAL_REMOTE systemd-journal-remote systemd-journal-remote)
 
 if(BUILD_TESTING)
   find_package(GTest QUIET)
@@ -29,5 +30,4 @@ if(BUILD_TESTING)
     message(FATAL_ERROR "Missing package: install libgtest-dev")
   endif()
   vell_find_program(DBUS_DAEMON dbus-daemon dbus-daemon)
-  vell_find_program(JOURNAL_REMOTE systemd-journal-remote systemd-journal-remote)
 endif()

@@ -39,7 +39,7 @@ class LogStore {
   /// Opens the store for reading and calls `completion` once, on the calling thread, before it
   /// returns. A store with no log at all, or with none that can be read, is an error; of several
   /// logs, those that cannot be read are passed over.
-  static void prepare(const Completion& completion);
+  void prepare(const Completion& completion) const;
 };
 
 /// Delivers the entries of a source to a handler, on a thread of its own.

@@ -28,6 +28,13 @@ void addItem(std::string_view item, EntryBatch& batch) {
   }
 }
 
+/// When the last entry was stored; it may be one that was added just now.
+std::uint64_t timeOfLast(sd_journal* journal) {
+  std::uint64_t first = 0;
+  std::uint64_t last = 0;
+  return sd_journal_get_cutoff_realtime_usec(journal, &first, &last) > 0 ? last : 0;
+}
+
 bool addMatches(sd_journal* journal, const std::vector<std::string>& matches) {
   return std::all_of(matches.begin(), matches.end(), [&](const std::string& match) {
     // Matches of one field are alternatives anyway.
@@ -53,13 +60,23 @@ JournalFileScan::JournalFileScan(JournalFile file, LogTime from)
 
 void JournalFileScan::start(const LogSelection& selection) {
   started = true;
-  if (!selection.isEverything() && !useIndex(selection)) {
-    close(true);
-  } else if (findEnd() && endRealtime >= earliest && seekStart()) {
+  damaged = !isTailReadable();
+  const bool mayHaveAny = selection.isEverything() || useIndex(selection);
+  if (mayHaveAny && findEnd() && endRealtime >= earliest && seekStart()) {
     advance();
   } else {
     close(true);
   }
+}
+
+/// Whether the library finds the last entry that the file has by its own account, and not, in a
+/// file that is damaged there, an earlier one.
+bool JournalFileScan::isTailReadable() {
+  const auto lastBefore = timeOfLast(journal.get());
+  std::uint64_t found = 0;
+  return sd_journal_seek_tail(journal.get()) >= 0 && sd_journal_previous(journal.get()) > 0 &&
+         sd_journal_get_realtime_usec(journal.get(), &found) >= 0 &&
+         (found == lastBefore || found == timeOfLast(journal.get()));
 }
 
 /// Restricts the walk to what the index finds. False when it finds that there is nothing.

@@ -42,6 +42,7 @@ class JournalFileScan {
   void advance();
 
  private:
+  bool isTailReadable();
   bool useIndex(const LogSelection& selection);
   bool isIndexWorthwhile(std::size_t matches, const LogSelection& selection);
   bool findEnd();

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <functional>
+#include <tuple>
 #include <utility>
 
 namespace {
@@ -27,6 +28,10 @@ bool isLastACopy(const EntryBatch& batch) {
 }
 
 }  // namespace
+
+bool JournalReading::Turn::operator>(const Turn& other) const {
+  return std::tie(realtime, file) > std::tie(other.realtime, other.file);
+}
 
 JournalReading::JournalReading(const std::optional<LogFilter>& filter, LogTime from)
     : selection(filter), start(from) {
@@ -89,7 +94,7 @@ bool JournalReading::isWanted(const EntryBatch& batch) const {
 void JournalReading::advance() {
   auto& file = files[*current];
   file.advance();
-  if (!file.isOpen() || (!turns.empty() && turns.front() < Turn{file.realtime(), *current})) {
+  if (!file.isOpen() || (!turns.empty() && Turn{file.realtime(), *current} > turns.front())) {
     waitForTurn(*std::exchange(current, std::nullopt));
   }
 }

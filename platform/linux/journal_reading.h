@@ -26,7 +26,7 @@ class JournalReading {
   struct Turn {
     std::uint64_t realtime;
     std::size_t file;
-    auto operator<=>(const Turn&) const = default;
+    bool operator>(const Turn& other) const;
   };
 
   void readEntry(EntryBatch& batch);

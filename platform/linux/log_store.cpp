@@ -14,7 +14,7 @@
 /// The device's journals, of which one at least can be read.
 class LogSource {};
 
-void LogStore::prepare(const Completion& completion) {
+void LogStore::prepare(const Completion& completion) const {
   const auto files = openJournalFiles(1);
   if (!files.opened.empty()) {
     completion(std::make_shared<LogSource>(), std::nullopt);

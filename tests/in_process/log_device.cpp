@@ -65,7 +65,7 @@ std::unique_ptr<WritableFile> WritableFile::open(const std::string& path) {
 
 class LogSource {};
 
-void LogStore::prepare(const Completion& completion) {
+void LogStore::prepare(const Completion& completion) const {
   if (logDevice().storeError) {
     completion(nullptr, LogStoreError{*logDevice().storeError});
   } else {

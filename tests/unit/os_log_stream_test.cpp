@@ -13,10 +13,12 @@ namespace {
 
 using in_process::LogDevice;
 using in_process::startLogDevice;
-using std::literals::operator""sv;
 
 const std::string kPath = "/exports/out.txt";
 const std::string kStarted = "Getting oslog stream: history = 3600.000000";
+
+constexpr char kOddBytes[] = "50 %d%s\n\0\tnaïve";
+constexpr std::string_view kOddMessage(kOddBytes, sizeof kOddBytes - 1);
 
 bool exportAll() {
   return OsLogStream::putOsLogStreamToFile(kPath, {}, {}, 3600);
@@ -74,9 +76,9 @@ TEST(OsLogStream, WritesOneLineForEachMessage) {
          e.process = e.sender = e.subsystem = e.category = e.composedMessage = "";
        },
        "2021-05-04 13:07:21 +0000 0x01a2b 0x0 42 (): [] \n"},
-      {"odd message", [](LogEntry& e) { e.composedMessage = "50 %d%s\n\0\tnaïve"sv; },
+      {"odd message", [](LogEntry& e) { e.composedMessage = kOddMessage; },
        "2021-05-04 13:07:21 +0000 0x01a2b 0x0 42 Linkward(libradio.so):org.vell.link [calls] " +
-           std::string("50 %d%s\n\0\tnaïve\n"sv)},
+           std::string(kOddMessage) + "\n"},
       {"another type", [](LogEntry& e) { e.type = 0; }, ""},
   };
   auto& device = startLogDevice();

@@ -1,0 +1,193 @@
+// What an export does when the journal or the file is not as it should be.
+
+#include "tests/journal/device_journal.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <fstream>
+#include <functional>
+#include <random>
+#include <string>
+#include <vector>
+
+namespace {
+
+namespace fs = std::filesystem;
+
+const std::string kLine =
+    "2021-05-04 13:07:21 +0000 0x00000 0x0 0 (null)((null)):(null) [(null)] m\n";
+
+const std::string kThreeLines = kLine + kLine + kLine;
+
+std::vector<StoredEntry> entries(std::size_t count) {
+  return std::vector<StoredEntry>(count, {1'620'133'641'000'000, {{"MESSAGE", "m"}}});
+}
+
+void writeFile(const fs::path& path, const std::string& content) {
+  std::ofstream(path, std::ios::binary) << content;
+}
+
+std::string randomBytes(std::size_t count) {
+  std::mt19937 random(count);
+  std::string bytes(count, '\0');
+  for (auto& byte : bytes) {
+    byte = static_cast<char>(random());
+  }
+  return bytes;
+}
+
+/// Overwrites a part of a file.
+void damage(const fs::path& path, std::streamoff start, std::size_t length) {
+  std::fstream file(path, std::ios::in | std::ios::out | std::ios::binary);
+  file.seekp(start) << randomBytes(length);
+}
+
+/// Has `words` run by somebody whom the permissions of files bind.
+std::vector<std::string> asNobody() {
+  if (geteuid() != 0) {
+    return {};
+  }
+  return {SETPRIV, "--reuid=65534", "--regid=65534", "--clear-groups"};
+}
+
+TEST(ExportFailures, TellWhyThereIsNoJournal) {
+  const struct {
+    const char* what;
+    std::function<void(const fs::path& journals)> prepare;
+    std::string error;
+  } cases[] = {
+      {"missing", [](const fs::path& journals) { fs::remove_all(journals.parent_path()); },
+       "No journal files were found"},
+      {"empty folder", [](const fs::path&) {}, "No journal files were found"},
+      {"garbage",
+       [](const fs::path& journals) { writeFile(journals / "system.journal", randomBytes(9999)); },
+       "Bad message"},
+      {"cut off",
+       [](const fs::path& journals) { fs::resize_file(journals / "system.journal", 5000); },
+       "No data available"},
+      {"no permission to read it",
+       [](const fs::path& journals) { fs::permissions(journals / "system.journal", fs::perms(0)); },
+       "Permission denied"},
+      {"no permission to look",
+       [](const fs::path& journals) { fs::permissions(journals, fs::perms(0)); },
+       "Permission denied"},
+  };
+  for (const auto& each : cases) {
+    SCOPED_TRACE(each.what);
+    DeviceJournal device;
+    if (each.what != std::string("empty folder")) {
+      device.store("system.journal", entries(3));
+      fs::permissions(device.journals() / "system.journal", fs::perms(0644));
+    }
+    each.prepare(device.journals());
+    // Somebody else must be able to reach the program and the folder.
+    fs::permissions(device.root(), fs::perms(0777));
+    fs::permissions(device.root() / "run/systemd/journal/socket", fs::perms(0777));
+    fs::copy_file(OSLOG_EXPORT_PATH, device.root() / "export");
+    auto start = device.exporting({kAllOfHistory, device.output()});
+    start.words[0] = device.root() / "export";
+    const auto runner = asNobody();
+    start.words.insert(start.words.begin(), runner.begin(), runner.end());
+    const auto result = TestProcess(start).finish();
+    EXPECT_EQ(result, (ProcessResult{1, "", ""}));
+    EXPECT_EQ(device.messages(), (std::vector<std::string>{"Could not open: " + each.error,
+                                                           "Failed to prepare oslog stream"}));
+    EXPECT_FALSE(fs::exists(device.output()));
+    std::error_code ignored;
+    fs::permissions(device.journals(), fs::perms(0700), ignored);
+  }
+}
+
+TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
+  DeviceJournal device;
+  device.store("system.journal", entries(20000));
+  const auto file = device.journals() / "system.journal";
+  const auto whole = device.run();
+  ASSERT_EQ(whole.content.size(), 20000 * kLine.size());
+
+  const auto size = static_cast<std::size_t>(fs::file_size(file));
+  damage(file, static_cast<std::streamoff>(size / 16), size / 16 * 15);
+  const auto part = device.run();
+  EXPECT_EQ(part.status, 0);
+  EXPECT_EQ(part.messages,
+            (std::vector<std::string>{startedMessage(), "Invalid oslog stream: reason = 1"}));
+  EXPECT_LT(part.content.size(), whole.content.size());
+  EXPECT_EQ(part.content, whole.content.substr(0, part.content.size()));
+
+  // A whole file beside it is read all the same.
+  device.store("user-1000.journal", entries(10));
+  writeFile(file, randomBytes(9999));
+  const auto other = device.run();
+  EXPECT_EQ(other.content.size(), 10 * kLine.size());
+  EXPECT_EQ(other.messages, part.messages);
+}
+
+struct OutputCase {
+  const char* what;
+  std::function<void(const fs::path& output)> prepare;
+  int status;
+  std::string message;  ///< In place of %, the path; empty when there is none.
+};
+
+TEST(ExportFailures, TellWhatTheFileIsNotFitFor) {
+  const std::string created = "Failed to create file: %";
+  const OutputCase cases[] = {
+      {"new", [](const fs::path&) {}, 0, ""},
+      {"there", [](const fs::path& output) { writeFile(output, std::string(9999, 'x')); }, 0, ""},
+      {"link", [](const fs::path& output) { fs::create_symlink("target", output); }, 0, ""},
+      {"folder", [](const fs::path& output) { fs::create_directory(output); }, 1, created},
+      {"in no folder", [](const fs::path& output) { fs::create_symlink("none/x", output); }, 1,
+       created},
+      {"null device", [](const fs::path& output) { fs::create_symlink("/dev/null", output); }, 0,
+       ""},
+      {"full disk", [](const fs::path& output) { fs::create_symlink("/dev/full", output); }, 1,
+       "Failed to write file: %: No space left on device"},
+      {"pipe that nobody reads",
+       [](const fs::path& output) { ASSERT_EQ(mkfifo(output.c_str(), 0600), 0); }, 1, created},
+  };
+  for (const auto& each : cases) {
+    SCOPED_TRACE(each.what);
+    DeviceJournal device;
+    device.store("system.journal", entries(3));
+    each.prepare(device.output());
+    const auto result = device.run();
+    auto message = each.message;
+    if (const auto path = message.find('%'); path != std::string::npos) {
+      message.replace(path, 1, device.output());
+    }
+    std::vector<std::string> messages;
+    if (message.find("create") == std::string::npos) {
+      messages.push_back(startedMessage());
+    }
+    if (!message.empty()) {
+      messages.push_back(message);
+    }
+    EXPECT_EQ(result.status, each.status);
+    EXPECT_EQ(result.messages, messages);
+    if (fs::is_regular_file(device.output())) {
+      EXPECT_EQ(result.content, kThreeLines);
+    }
+  }
+}
+
+TEST(ExportFailures, KeepANewFileToItsOwner) {
+  DeviceJournal device;
+  device.store("system.journal", entries(1));
+  const auto mask = umask(0);
+  device.run();
+  umask(mask);
+  EXPECT_EQ(fs::status(device.output()).permissions(), fs::perms(0600));
+  // One that is there stays as open as it was.
+  fs::permissions(device.output(), fs::perms(0644));
+  EXPECT_EQ(device.run().content, kLine);
+  EXPECT_EQ(fs::status(device.output()).permissions(), fs::perms(0644));
+}
+
+TEST(ExportFailures, NeedAHistoryAndAPath) {
+  const DeviceJournal device;
+  EXPECT_EQ(TestProcess(device.exporting({"60"})).finish(),
+            (ProcessResult{1, "os log collection: Failed\n", ""}));
+}
+
+}  // namespace
