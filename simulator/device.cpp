@@ -77,6 +77,9 @@ bool Device::start(const DeviceModel& model) {
     complain("cannot open the manager's control pipe");
     return false;
   }
+  if (model.journalRuns() && !startService("journal")) {
+    return false;
+  }
   if (!model.busRuns()) {
     return true;
   }

@@ -157,6 +157,7 @@ DeviceModel DeviceModel::fromProfile(const SettingsFile& profile,
                                      std::vector<SettingsFile::Fault>& faults) {
   ProfileReader reader(profile, faults);
   DeviceModel model;
+  model.journal = reader.either("JOURNAL", "yes", "no", true);
   model.bus = reader.either("BUS", "yes", "no", true);
   model.manager = reader.either("MANAGER", "running", "absent", true);
   model.helper = reader.either("HELPER", "running", "absent", true);

@@ -53,6 +53,7 @@ class DeviceModel {
   static DeviceModel fromProfile(const SettingsFile& profile,
                                  std::vector<SettingsFile::Fault>& faults);
 
+  [[nodiscard]] bool journalRuns() const { return journal; }
   [[nodiscard]] bool busRuns() const { return bus; }
   [[nodiscard]] bool managerRuns() const { return manager; }
   [[nodiscard]] bool helperRuns() const { return helper; }
@@ -81,6 +82,7 @@ class DeviceModel {
   [[nodiscard]] Answer dumpTraces(const MessageDict& request) const;
   [[nodiscard]] std::string traceSuffix() const;
 
+  bool journal = true;
   bool bus = true;
   bool manager = true;
   bool helper = true;

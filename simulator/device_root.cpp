@@ -107,9 +107,13 @@ std::unique_ptr<DeviceRoot> DeviceRoot::create(const Profile& profile) {
 }
 
 DeviceRoot::~DeviceRoot() {
+  // What the device's processes have started ends a little after them, and may still make files.
+  constexpr int kMostAttempts = 100;
   std::error_code error;
-  fs::remove_all(root, error);
-  if (error) {
+  for (int attempt = 0; attempt < kMostAttempts && fs::exists(root); ++attempt) {
+    fs::remove_all(root, error);
+  }
+  if (fs::exists(root)) {
     complain("cannot remove " + root.string() + ": " + error.message());
   }
 }

@@ -5,6 +5,7 @@
 #include "simulator/device.h"
 #include "simulator/device_root.h"
 #include "simulator/helper_service.h"
+#include "simulator/journal.h"
 #include "simulator/manager_service.h"
 #include "simulator/options.h"
 #include "simulator/profile.h"
@@ -12,6 +13,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -24,12 +26,17 @@ using simulator::complain;
 
 constexpr int kUsageError = 2;
 
-/// Becomes the daemon, which prints its address on standard output once it can be reached. What it
-/// has to say otherwise goes to `log`, or to standard error when that is empty.
-int serveBus(const std::string& log) {
+/// Has what a service and the programs it starts say on standard error go to `log`, if there is
+/// one.
+void redirectErrors(const std::string& log) {
   if (!log.empty() && std::freopen(log.c_str(), "a", stderr) == nullptr) {
     complain(log + ": " + std::strerror(errno));
   }
+}
+
+/// Becomes the daemon, which prints its address on standard output once it can be reached.
+int serveBus(const std::string& log) {
+  redirectErrors(log);
   const auto configuration = "--config-file=" + (sysroot() / simulator::kBusConfiguration).string();
   // A socket that an earlier daemon left behind would be in the way.
   unlink((sysroot() / simulator::kBusSocket).c_str());
@@ -37,6 +44,17 @@ int serveBus(const std::string& log) {
          configuration.c_str(), nullptr);
   complain(std::string("dbus-daemon: ") + std::strerror(errno));
   return EXIT_FAILURE;
+}
+
+int serveJournal(const std::string& log) {
+  redirectErrors(log);
+  const auto now = std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
+  const auto journal = simulator::Journal::create(sysroot(), simulator::lastHourOfDevice(now));
+  if (!journal) {
+    return EXIT_FAILURE;
+  }
+  std::cout << "ready" << std::endl;
+  return journal->run();
 }
 
 template <typename NamedService>
@@ -58,6 +76,9 @@ int serve(const simulator::Options& options) {
   std::ofstream(sysroot() / "run" / (options.service + ".pid")) << getpid() << "\n";
   if (options.service == "bus") {
     return serveBus(options.requestLog);
+  }
+  if (options.service == "journal") {
+    return serveJournal(options.requestLog);
   }
   const auto path = sysroot() / simulator::kDeviceProfile;
   const auto profile = SettingsFile::read(path).value_or(SettingsFile());

@@ -11,7 +11,8 @@ namespace simulator {
 namespace {
 
 constexpr const char* kUsage =
-    "usage: vell-simulator [PROFILE] [-- COMMAND...] | --serve bus|manager|helper [LOGFILE]";
+    "usage: vell-simulator [PROFILE] [-- COMMAND...] | --serve bus|manager|helper|journal "
+    "[LOGFILE]";
 
 std::optional<Options> refuse(const std::string& what) {
   complain(what + "; " + kUsage);
@@ -19,7 +20,7 @@ std::optional<Options> refuse(const std::string& what) {
 }
 
 std::optional<Options> parseService(const std::vector<std::string>& words) {
-  constexpr const char* kServices[] = {"bus", "manager", "helper"};
+  constexpr const char* kServices[] = {"bus", "manager", "helper", "journal"};
   if (words.size() < 2 || words.size() > 3) {
     return refuse("--serve takes a service and perhaps a file");
   }

@@ -27,7 +27,8 @@ TestProcess startSimulator(std::vector<std::string> words) {
 
 SimulatedDevice::SimulatedDevice(const std::string& profile)
     : process([&] {
-        const TemporaryFile file(profile);
+        const bool speaksOfJournal = profile.find("JOURNAL=") != std::string::npos;
+        const TemporaryFile file(speaksOfJournal ? profile : profile + "\nJOURNAL=no\n");
         auto simulator = startSimulator({file.path(), "--", "/bin/sh", "-c", kHold});
         rootPath = simulator.readLine();
         address = simulator.readLine();

@@ -10,6 +10,7 @@
 class SimulatedDevice {
  public:
   /// Starts the device of a profile, given as its text, and waits until all of it can be reached.
+  /// It has no journal unless the profile speaks of one.
   /// Throws std::runtime_error with the simulator's words when it does not start.
   explicit SimulatedDevice(const std::string& profile);
   SimulatedDevice(const SimulatedDevice&) = delete;
