@@ -94,7 +94,7 @@ TEST(SimulatedJournal, HoldsTheDevicesLogAndWhatIsLoggedToIt) {
 
 TEST(SimulatedJournal, TakesWellFormedMessagesAlone) {
   const auto entry = simulator::fromNativeProtocol(
-      std::string("A=1\nB_2\n\x03\0\0\0\0\0\0\0x\ny\n_PID=1\nC=\n", 31));
+      std::string("A=1\nB_2\n\x03\0\0\0\0\0\0\0x\ny\n_PID=1\nC=\n", 30));
   ASSERT_TRUE(entry);
   EXPECT_EQ(entry->fields, (std::vector<std::pair<std::string, std::string>>{
                                {"A", "1"}, {"B_2", "x\ny"}, {"C", ""}}));
@@ -104,7 +104,7 @@ TEST(SimulatedJournal, TakesWellFormedMessagesAlone) {
                                                          25)),
       std::string::npos);
   for (const auto& bad : {std::string("A=1"), std::string("=1\n"), std::string("a=1\n"),
-                          std::string("A\n\x09\0\0\0\0\0\0\0x\n", 13), std::string("A\nB\n")}) {
+                          std::string("A\n\x09\0\0\0\0\0\0\0x\n", 12), std::string("A\nB\n")}) {
     EXPECT_FALSE(simulator::fromNativeProtocol(bad));
   }
 }
