@@ -142,6 +142,10 @@ class vell::client::Manager {
         connection("manager.client",
                    {[this](sd_bus* bus) { onConnected(bus); }, [this] { onLost(); }}) {}
 
+  Manager(const Manager&) = delete;
+  Manager& operator=(const Manager&) = delete;
+  ~Manager() { subscriptions.switchOff(); }
+
   void perform(const std::string& command, const MessageDict& request,
                std::function<void(BusAnswer)> handler) {
     connection.call(managerCall(kInterface, "PerformCommand",

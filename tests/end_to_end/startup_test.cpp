@@ -4,6 +4,7 @@
 #include "tests/end_to_end/system_log_socket.h"
 
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include <algorithm>
 #include <fstream>
@@ -137,24 +138,50 @@ TEST(StartUp, ReportsWhatIsWrongWithTheProfileAndGoesOn) {
                 profile.string() + ":5: INTERNAL_BUILD: value is not quoted as it must be",
                 profile.string() + ":2: PRODUCT_CODE: 'many' is not an integer"}));
 
+  // More than the socket takes while nobody reads from it.
+  std::ofstream many(profile, std::ios::app);
+  for (int line = 0; line < 1000; ++line) {
+    many << "nonsense\n";
+  }
+  many.close();
+  EXPECT_EQ(device.runTool({"help"}), kStarted);
+  static_cast<void>(log.messages());
+
+  // What is no file is not waited for.
   std::filesystem::remove(profile);
-  std::filesystem::create_directory(profile);
+  ASSERT_EQ(mkfifo(profile.c_str(), 0600), 0);
   EXPECT_EQ(device.runTool({"help"}), kNoRadio);
   EXPECT_EQ(log.messages(), std::vector<std::string>{profile.string() + ": not a file"});
 }
 
 TEST(StartUp, SaysWhyTheShellThreadCannotBeStarted) {
+#ifdef VELL_SANITIZED
+  GTEST_SKIP() << "A sanitizer needs an address space without limits.";
+#endif
   const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
   // A stack that no address space has room for.
-  auto tool =
-      device.start({{"/bin/sh", "-c", "ulimit -s 200000000000 && exec \"$0\" help", VELLTOOL_PATH},
-                    {},
-                    "",
-                    false});
-  EXPECT_EQ(tool.finish(),
+  const auto* const line = "ulimit -s 200000000000 && exec \"$0\" help";
+  EXPECT_EQ(device.start({{"/bin/sh", "-c", line, VELLTOOL_PATH}, {}, "", false}).finish(),
             (ProcessResult{1, "",
                            "velltool: cannot start the shell thread: Resource temporarily "
                            "unavailable\n"}));
+}
+
+TEST(StartUp, KeepsClosedStreamsFree) {
+  const SimulatedDevice device("RADIO_TYPE=1\nJOURNAL=yes");
+  const auto file = device.root() / "export.txt";
+  for (const auto* closed : {">&-", "<&-", "2>&-", ">/dev/full"}) {
+    SCOPED_TRACE(closed);
+    const std::string line =
+        "exec \"$0\" logdump oslog 3600 \"$1\" -- logdump oslog -- help " + std::string(closed);
+    EXPECT_EQ(device.start({{"/bin/sh", "-c", line, VELLTOOL_PATH, file.string()}, {}, "", false})
+                  .finish()
+                  .status,
+              1);
+    const auto exported = contentOf(file);
+    EXPECT_NE(exported, "");
+    EXPECT_EQ(exported.find("Failed"), std::string::npos);
+  }
 }
 
 TEST(StartUp, ExportsItsInterfaceAndNothingElse) {

@@ -1,6 +1,7 @@
 #include "platform/work_queue.h"
 
 #include <gtest/gtest.h>
+#include <pthread.h>
 
 #include <future>
 #include <optional>
@@ -43,4 +44,19 @@ TEST(WorkQueue, MayLoseItsLastHandleOnItsOwnThread) {
     });
   }
   done.get_future().wait();
+}
+
+TEST(WorkQueue, IsAbsentWhenNoThreadCanBeStarted) {
+#ifdef VELL_SANITIZED
+  GTEST_SKIP() << "A sanitizer gives threads stacks of its own choice.";
+#endif
+  pthread_attr_t usual{};
+  ASSERT_EQ(pthread_getattr_default_np(&usual), 0);
+  pthread_attr_t boundless = usual;
+  constexpr std::size_t kMoreThanThereIs = std::size_t{1} << 47U;
+  ASSERT_EQ(pthread_attr_setstacksize(&boundless, kMoreThanThereIs), 0);
+  ASSERT_EQ(pthread_setattr_default_np(&boundless), 0);
+  EXPECT_FALSE(WorkQueue::create("test"));
+  pthread_setattr_default_np(&usual);
+  EXPECT_TRUE(WorkQueue::create("test"));
 }
