@@ -14,10 +14,16 @@ _velltool() {
 
   local choices=
   case "${words[0]-}:${words[1]-}:${#words[@]}" in
-    ::0) choices='logdump help cd' ;;
+    ::0) choices='logdump help' ;;
     logdump::1) choices='tel core bb oslog help' ;;
-    logdump:tel:* | logdump:core:*) choices='nocompress tar.gz tar nonui --' ;;
-    logdump:bb:*) choices='nocompress tar.gz tar --' ;;
+    logdump:tel:* | logdump:core:* | logdump:bb:*)
+      # Keywords count up to the reason, which is the first other word.
+      choices='nocompress tar.gz tar --'
+      [[ ${words[1]} == bb ]] || choices+=' nonui'
+      for word in "${words[@]:2}"; do
+        [[ ${word,,} =~ ^(nocompress|tar|tar\.gz|nonui)$ ]] || choices=--
+      done
+      ;;
     logdump:oslog:3)
       compopt -o default
       return

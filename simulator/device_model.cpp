@@ -92,6 +92,9 @@ std::string presentTime() {
   return text.str();
 }
 
+// The manager's own names for collections and its own words for on. The tool has them too, and the
+// tests see whether the two agree.
+
 /// Whether the manager takes the value of a trace property for on.
 bool isOn(const TypedSetting& setting) {
   auto text = setting.type == ValueType::String ? setting.text.value_or("") : "";
