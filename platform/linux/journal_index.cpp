@@ -8,14 +8,8 @@
 
 namespace {
 
-constexpr std::string_view kReplacement = "\xEF\xBF\xBD";
-
 std::string_view nameOf(JournalField field) {
   return kJournalFieldNames[indexOf(field)];
-}
-
-std::string matchOf(JournalField field, std::string_view value) {
-  return std::string(nameOf(field)).append("=").append(value);
 }
 
 /// Adds a match for each of the distinct values of `field` that is `wanted`. False when the index
@@ -43,23 +37,20 @@ bool addWantedValues(sd_journal* journal, JournalField field,
 
 std::optional<std::vector<std::string>> findIndexMatches(sd_journal* journal,
                                                          const LogSelection& selection) {
-  std::vector<std::string> matches;
   const auto selectsPath = [&](std::string_view path) { return selection.selectsImagePath(path); };
+  const auto selectsName = [&](std::string_view name) { return selection.selectsProcess(name); };
   const auto selectsExecutable = [&](std::string_view path) {
-    return selection.selectsProcess(lastComponent(path)) || selectsPath(path);
+    return selectsName(lastComponent(path)) || selectsPath(path);
   };
-  if (!addWantedValues(journal, JournalField::Executable, selectsExecutable, matches) ||
-      !addWantedValues(journal, JournalField::SenderImagePath, selectsPath, matches)) {
-    return std::nullopt;
-  }
-  // An entry without an executable goes by its other names, which need not be listed to be matched.
-  for (const auto& name : selection.processNames()) {
-    if (name.find(kReplacement) != std::string::npos) {
-      // This may stand for broken bytes, and only the listing of all values would tell for which.
-      return std::nullopt;
-    }
-    matches.push_back(matchOf(JournalField::CommandName, name));
-    matches.push_back(matchOf(JournalField::SyslogIdentifier, name));
-  }
-  return matches;
+  std::vector<std::string> matches;
+  const auto add = [&](JournalField field, const auto& wanted) {
+    return addWantedValues(journal, field, wanted, matches);
+  };
+  // An entry without an executable goes by its other names, and one with an executable has them
+  // too: what they match in vain is asked and passed over.
+  const bool listed = add(JournalField::Executable, selectsExecutable) &&
+                      add(JournalField::SenderImagePath, selectsPath) &&
+                      add(JournalField::CommandName, selectsName) &&
+                      add(JournalField::SyslogIdentifier, selectsName);
+  return listed ? std::optional(std::move(matches)) : std::nullopt;
 }

@@ -29,18 +29,15 @@ class LogSelection {
   [[nodiscard]] bool selectsProcess(std::string_view process) const;
   [[nodiscard]] bool selectsImagePath(std::string_view imagePath) const;
 
-  /// The names, valid UTF-8, that select a process.
+ private:
   struct Hash : std::hash<std::string_view> {
     using is_transparent = void;
   };
-  using Names = std::unordered_set<std::string, Hash, std::equal_to<>>;
-  [[nodiscard]] const Names& processNames() const { return names; }
 
- private:
   [[nodiscard]] bool containsPathText(std::string_view imagePath) const;
 
   bool everything;
-  Names names;
-  std::vector<std::string> pathTexts;  ///< Folded.
+  std::unordered_set<std::string, Hash, std::equal_to<>> names;  ///< Valid UTF-8.
+  std::vector<std::string> pathTexts;                            ///< Folded.
   mutable std::unordered_map<std::string, bool, Hash, std::equal_to<>> pathVerdicts;
 };
