@@ -163,9 +163,8 @@ std::vector<std::string> expectedNumbers(const std::vector<std::vector<ModelEntr
     return left.stored.realtime < right.stored.realtime;
   });
   std::vector<std::string> numbers;
-  for (const auto& entry : selected) {
-    numbers.push_back(entry.number);
-  }
+  std::transform(selected.begin(), selected.end(), std::back_inserter(numbers),
+                 [](const ModelEntry& entry) { return entry.number; });
   return numbers;
 }
 
