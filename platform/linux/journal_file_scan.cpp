@@ -100,7 +100,7 @@ bool JournalFileScan::useIndex(const LogSelection& selection) {
 /// step for each entry that is not selected. How many those are shows in the first entries.
 bool JournalFileScan::isIndexWorthwhile(std::size_t matches, const LogSelection& selection) {
   constexpr std::size_t kAlwaysWorthwhile = 3;
-  constexpr std::size_t kSample = 100;
+  constexpr std::size_t kSample = 50;
   if (matches <= kAlwaysWorthwhile || !seekStart()) {
     return true;
   }

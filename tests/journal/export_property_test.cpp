@@ -104,7 +104,7 @@ ModelEntry makeEntry(Chance& chance, std::uint64_t realtime, const std::string& 
 std::vector<std::vector<ModelEntry>> makeFiles(Chance& chance) {
   constexpr std::uint64_t kTime = 1'620'133'641'000'000;
   std::vector<std::vector<ModelEntry>> files(1 + chance.below(3));
-  const auto longest = chance.below(2) == 0 ? 40 : 400;
+  const std::size_t longest = chance.below(2) == 0 ? 40 : 400;
   for (std::size_t file = 0; file < files.size(); ++file) {
     std::uint64_t time = kTime + file;
     const auto count = 1 + chance.below(longest);
@@ -163,9 +163,8 @@ std::vector<std::string> expectedNumbers(const std::vector<std::vector<ModelEntr
     return left.stored.realtime < right.stored.realtime;
   });
   std::vector<std::string> numbers;
-  for (const auto& entry : selected) {
-    numbers.push_back(entry.number);
-  }
+  std::transform(selected.begin(), selected.end(), std::back_inserter(numbers),
+                 [](const ModelEntry& entry) { return entry.number; });
   return numbers;
 }
 
