@@ -66,9 +66,14 @@ Device::Device(const DeviceRoot& deviceRoot)
 }
 
 Device::~Device() {
-  for (const auto& [process, name] : services) {
-    kill(process, SIGKILL);
-    awaitChild(process);
+  // The bus goes last, so that no service sees it go and ends in its own way meanwhile.
+  for (const bool busItself : {false, true}) {
+    for (const auto& [process, name] : services) {
+      if ((name == "bus") == busItself) {
+        kill(process, SIGKILL);
+        awaitChild(process);
+      }
+    }
   }
 }
 
