@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <csignal>
 
 namespace {
@@ -13,6 +14,29 @@ ProcessResult runSimulator(const std::vector<std::string>& words) {
 }
 
 }  // namespace
+
+TEST(Simulator, HasAJournalThatTakesWhatIsLogged) {
+  const SimulatedDevice device("RADIO_TYPE=1\nJOURNAL=yes");
+  const auto file = device.root() / "out.txt";
+  const auto linesWith = [&](const std::vector<std::string>& selection, const std::string& text) {
+    std::vector<std::string> words = {"logdump", "oslog", "3600", file.string()};
+    words.insert(words.end(), selection.begin(), selection.end());
+    EXPECT_EQ(device.runTool(words), (ProcessResult{0, "", ""}));
+    const auto lines = linesOf(contentOf(file));
+    return std::count_if(lines.begin(), lines.end(), [&](const std::string& line) {
+      return line.find(text) != std::string::npos;
+    });
+  };
+  EXPECT_GT(linesWith({}, " Linkward(Linkward):linkward.service [Linkward] cell 310-410"), 3);
+  EXPECT_GT(linesWith({}, " haldend(haldend):haldend.service [haldend] modem awake"), 3);
+  EXPECT_EQ(linesWith({}, "sshd"), 0);
+  EXPECT_GT(linesWith({"-p", "sshd"}, "sshd"), 3);
+  // Each export logs what it starts with, which a later one finds.
+  while (linesWith({"-p", "velltool"},
+                   " velltool(velltool):(null) [velltool] Getting oslog stream: history = "
+                   "3600.000000") == 0) {
+  }
+}
 
 TEST(Simulator, GivesTheStatusOfItsCommand) {
   EXPECT_EQ(runSimulator({"--", "/bin/sh", "-c", "echo out; echo err >&2; exit 7"}),

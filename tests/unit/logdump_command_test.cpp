@@ -44,20 +44,6 @@ TEST(LogdumpCommand, AsksForTheVendorOfTheRadioOnceForCoreDumps) {
   EXPECT_EQ(runTool("TIMESTAMP=T\nRADIO_VENDOR=2", {"logdump", "core"}).output, output);
 }
 
-TEST(LogdumpCommand, RefusesAllButBasebandLogsWhileTheManagerIsDown) {
-  const std::string refusal = "Server is not running. Please try after server starts.\n";
-  for (const auto* word : {"tel", "core", "oslog"}) {
-    const auto run = runTool("MANAGER=absent", {"logdump", word, "--", "logdump", "tel"});
-    EXPECT_FALSE(run.result) << word;
-    EXPECT_EQ(run.output, "") << word;
-    EXPECT_EQ(run.errors, refusal) << word;
-  }
-  const auto run = runTool("MANAGER=absent", {"logdump", "bb"});
-  EXPECT_FALSE(run.result);
-  EXPECT_EQ(run.output, "Baseband log collection: Failed\n");
-  EXPECT_EQ(run.errors, "");
-}
-
 TEST(VellShell, NamesItsRootAfterTheProgramAndItsClientAfterTheTool) {
   auto& device = in_process::startDevice("");
   device.programName = "mytool";
