@@ -82,6 +82,16 @@ TEST(Simulator, RefusesWhatItCannotRead) {
   }
 }
 
+TEST(Simulator, WarnsOfMisspeltKeys) {
+  const TemporaryFile profile(
+      "JOURNAL=no\nTRACE_DUMP_STAT=die\nSERVER_STATE_TYPE=string\nAny.Property=1\n");
+  EXPECT_EQ(runSimulator({profile.path(), "--", "/bin/true"}),
+            (ProcessResult{0, "",
+                           "vell-simulator: " + profile.path() +
+                               ":2: TRACE_DUMP_STAT: not a key of the simulator's; it changes "
+                               "nothing\n"}));
+}
+
 TEST(Simulator, CleansUpHoweverItEnds) {
   for (const int signalNumber : {0, SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     SCOPED_TRACE(signalNumber);
