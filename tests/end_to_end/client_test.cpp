@@ -88,6 +88,8 @@ TEST_F(Client, DeliversNothingOnceEventsAreOff) {
   vell::client::EventsOn(manager);
   EXPECT_EQ(statusOf(vell::kCommandGetTraceProperty), 0);
   drainQueue();
+  // The end of the service is an event, too.
+  vell::client::EventsOff(manager);
   EXPECT_EQ(states, (std::vector<std::string>{"Started", "Stopped"}));
 }
 
