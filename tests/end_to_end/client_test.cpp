@@ -66,6 +66,8 @@ TEST_F(Client, AsksSynchronouslyWhileItsQueueIsBusyAndFromItsQueue) {
 TEST_F(Client, DeliversNothingOnceEventsAreOff) {
   start("MANAGER=absent");
   auto service = device->serve("manager");
+  // Anew, so that the coming of the service is no event.
+  manager = CreateManager("test", queue);
   vell::client::RegisterEventHandler(manager, vell::kEventServerStateChange,
                                      [&](const MessageDict& payload, const WorkGroup&) {
                                        states.push_back(payload.getString(vell::kKeyServerState));
