@@ -24,6 +24,7 @@ class WritableFile {
 
   /// Moves the position to the end of the file and writes all of `bytes` there, unbuffered. Gives
   /// the error of write(2) when not all could be written, "timed out" when the other side of a pipe
-  /// or terminal took nothing for ten seconds. Must be called where SIGPIPE is ignored or blocked.
+  /// or terminal did not take them within ten seconds. Must be called where SIGPIPE is ignored or
+  /// blocked.
   [[nodiscard]] virtual std::error_code append(std::string_view bytes) = 0;
 };

@@ -71,8 +71,9 @@ class LogReader {
   /// Called once when the reader has ended by itself, after the last entry.
   void setInvalidationHandler(InvalidationHandler handler);
 
-  /// Starts delivering, oldest first, the entries that are stored now and whose time is not before
-  /// `from`, and returns at once. To be called once. What is logged from now on is not delivered.
+  /// Starts delivering, oldest first, the entries that are stored when the reading starts, which is
+  /// presently, and whose time is not before `from`; returns at once. To be called once. What is
+  /// logged after that is not delivered.
   void activate(LogTime from);
 
   /// Stops the reader. No handler is called any more, but one call that has begun, or is about to,

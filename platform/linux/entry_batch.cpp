@@ -1,5 +1,7 @@
 #include "platform/linux/entry_batch.h"
 
+#include <utility>
+
 namespace {
 
 constexpr std::size_t kMostEntries = 256;
@@ -8,7 +10,7 @@ constexpr std::size_t kMostBytes = 256UL * 1024;
 }  // namespace
 
 void EntryBatch::begin(Stamp stamp) {
-  entries.push_back({stamp, bytes.size(), {}});
+  entries.push_back({std::move(stamp), bytes.size(), {}});
 }
 
 void EntryBatch::add(JournalField field, std::string_view value) {

@@ -11,11 +11,11 @@
 /// values of all of them lie one after the other in one piece of memory, which is used again.
 class EntryBatch {
  public:
-  /// When an entry was stored, in microseconds, and in which file.
+  /// When an entry was stored, in microseconds, in which file, and where there.
   struct Stamp {
     std::uint64_t realtime = 0;
-    std::uint64_t monotonic = 0;  ///< 0 when nobody asked.
     std::size_t file = 0;
+    std::string cursor;  ///< Empty when nobody asked.
 
     bool operator==(const Stamp&) const = default;
   };

@@ -7,11 +7,15 @@
 #include <sys/stat.h>
 
 #include <cerrno>
+#include <chrono>
+#include <optional>
 #include <utility>
 
 namespace {
 
-constexpr int kPatienceMilliseconds = 10'000;
+using Clock = std::chrono::steady_clock;
+
+constexpr std::chrono::seconds kPatience{10};
 constexpr mode_t kOwnerAlone = S_IRUSR | S_IWUSR;
 
 /// Without O_NONBLOCK, a pipe that nobody reads would hold up the open, and later the write.
@@ -25,10 +29,11 @@ FileDescriptor openForWriting(const std::string& path, int flags) {
   return FileDescriptor(open(path.c_str(), kWriting | flags, kOwnerAlone));
 }
 
-/// Waits until a pipe or terminal takes more.
-std::error_code waitForRoom(int file) {
+/// Waits until a pipe or terminal takes more, no longer than `limit`.
+std::error_code waitForRoom(int file, Clock::time_point limit) {
+  const auto left = std::chrono::ceil<std::chrono::milliseconds>(limit - Clock::now());
   pollfd waiting{file, POLLOUT, 0};
-  const int ready = poll(&waiting, 1, kPatienceMilliseconds);
+  const int ready = left.count() <= 0 ? 0 : poll(&waiting, 1, static_cast<int>(left.count()));
   if (ready == 0) {
     return std::make_error_code(std::errc::timed_out);
   }
@@ -43,12 +48,14 @@ class AppendedFile : public WritableFile {
 
   std::error_code append(std::string_view bytes) override {
     std::error_code error;
+    std::optional<Clock::time_point> limit;
     while (!bytes.empty() && !error) {
       const auto written = write(file.get(), bytes.data(), bytes.size());
       if (written >= 0) {
         bytes.remove_prefix(static_cast<std::size_t>(written));
       } else if (errno == EAGAIN) {
-        error = waitForRoom(file.get());
+        limit = limit.value_or(Clock::now() + kPatience);
+        error = waitForRoom(file.get(), *limit);
       } else if (errno != EINTR) {
         error.assign(errno, std::generic_category());
       }

@@ -12,15 +12,6 @@ struct CharactersReleaser {
   void operator()(char* characters) const { std::free(characters); }
 };
 
-std::string cursorOf(sd_journal* journal) {
-  char* cursor = nullptr;
-  if (sd_journal_get_cursor(journal, &cursor) < 0) {
-    return {};
-  }
-  const std::unique_ptr<char, CharactersReleaser> owner(cursor);
-  return cursor;
-}
-
 void addItem(std::string_view item, EntryBatch& batch) {
   const auto equals = item.find('=');
   if (const auto field = findJournalField(item.substr(0, equals))) {
@@ -78,9 +69,12 @@ void JournalFileScan::start(const LogSelection& selection) {
 bool JournalFileScan::isTailReadable() {
   const auto lastBefore = timeOfLast(journal.get());
   std::uint64_t found = 0;
-  return sd_journal_seek_tail(journal.get()) >= 0 && sd_journal_previous(journal.get()) > 0 &&
-         sd_journal_get_realtime_usec(journal.get(), &found) >= 0 &&
-         (found == lastBefore || found == timeOfLast(journal.get()));
+  if (sd_journal_seek_tail(journal.get()) < 0 || sd_journal_previous(journal.get()) <= 0 ||
+      sd_journal_get_realtime_usec(journal.get(), &found) < 0) {
+    return false;
+  }
+  // Entries may have been added meanwhile.
+  return found == lastBefore || (found > lastBefore && found <= timeOfLast(journal.get()));
 }
 
 /// Restricts the walk to what the index finds. False when it finds that there is nothing.
@@ -118,8 +112,9 @@ bool JournalFileScan::findEnd() {
       sd_journal_get_realtime_usec(journal.get(), &endRealtime) < 0) {
     return false;
   }
-  endCursor = cursorOf(journal.get());
-  return true;
+  endCursor = cursor();
+  damaged = damaged || endCursor.empty();
+  return !endCursor.empty();
 }
 
 bool JournalFileScan::seekStart() {
@@ -127,14 +122,17 @@ bool JournalFileScan::seekStart() {
                         : sd_journal_seek_realtime_usec(journal.get(), earliest)) >= 0;
 }
 
-std::uint64_t JournalFileScan::monotonic() const {
-  std::uint64_t time = 0;
-  sd_id128_t boot{};
-  return sd_journal_get_monotonic_usec(journal.get(), &time, &boot) < 0 ? 0 : time;
+std::string JournalFileScan::cursor() const {
+  char* text = nullptr;
+  if (sd_journal_get_cursor(journal.get(), &text) < 0) {
+    return {};
+  }
+  const std::unique_ptr<char, CharactersReleaser> owner(text);
+  return text;
 }
 
 bool JournalFileScan::read(EntryBatch::Stamp stamp, EntryBatch& batch) {
-  batch.begin(stamp);
+  batch.begin(std::move(stamp));
   const void* data = nullptr;
   std::size_t length = 0;
   sd_journal_restart_data(journal.get());

@@ -31,8 +31,8 @@ class JournalFileScan {
   /// no later than its first entry. It never goes back, but in a file whose machine's clock did.
   [[nodiscard]] std::uint64_t realtime() const { return currentRealtime; }
 
-  /// The monotonic time that goes with it; 0 when it cannot be told.
-  [[nodiscard]] std::uint64_t monotonic() const;
+  /// The cursor of that entry, see sd_journal_get_cursor(3); empty when there is none to be had.
+  [[nodiscard]] std::string cursor() const;
 
   /// Puts the entry into `batch`, under `stamp`. False, with nothing put there, when it cannot be
   /// read.
@@ -53,7 +53,7 @@ class JournalFileScan {
   std::uint64_t earliest = 0;  ///< Where to start.
   std::uint64_t currentRealtime = 0;
   std::uint64_t endRealtime = 0;
-  std::string endCursor;  ///< See sd_journal_get_cursor(3).
+  std::string endCursor;
   bool started = false;
   bool atEnd = false;  ///< Whether the walk is at the last entry.
   bool damaged = false;

@@ -63,12 +63,12 @@ class Opener {
     const auto before = known.size();
     for (const auto* base : {"var/log/journal", "run/log/journal"}) {
       const Folder folder(sysroot() / base);
-      note(folder.error);
+      noteUnopened(folder.error);
       openFilesOf(folder);
       for (const auto& path : folder.contents) {
         if (isJournalFolder(path.filename())) {
           const Folder machine(path);
-          note(machine.error);
+          noteUnopened(machine.error);
           openFilesOf(machine);
         }
       }
@@ -91,8 +91,7 @@ class Opener {
     FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     struct stat status {};
     if (!file || fstat(file.get(), &status) != 0) {
-      // What is gone already was rotated away.
-      note(errno == ENOENT ? 0 : errno);
+      noteUnopened(errno);
       return;
     }
     if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
@@ -113,6 +112,14 @@ class Opener {
     sd_journal_set_data_threshold(opened, 0);
     files.opened.push_back({JournalPtr(opened), isLiveFile(path.filename().native())});
     return true;
+  }
+
+  /// What is gone was rotated away, and what is forbidden is not the user's to read; for any other
+  /// reason something is missing.
+  void noteUnopened(int error) {
+    note(error == ENOENT ? 0 : error);
+    files.damaged =
+        files.damaged || (error != 0 && error != ENOENT && error != EACCES && error != EPERM);
   }
 
   void note(int error) {

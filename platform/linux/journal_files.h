@@ -27,7 +27,7 @@ struct JournalFile {
 struct JournalFiles {
   std::vector<JournalFile> opened;
   int error = 0;         ///< Why the first that could not be opened could not (errno); else 0.
-  bool damaged = false;  ///< Whether one could not be opened for what is in it.
+  bool damaged = false;  ///< Whether one is missing that is there and may be read.
 };
 
 /// Opens the files below the sysroot, or the local machine's own, as sd_journal_open(3) finds them:

@@ -12,15 +12,36 @@ namespace {
 /// How many entries are looked at before the reading comes back without a full batch.
 constexpr std::size_t kStepsAtOnce = 4096;
 
-/// Whether the last entry is one that another file has given already: the system copies entries
-/// from file to file, for instance when the disk becomes writable.
+/// One part of a cursor: what stands behind `key` and "=".
+std::string_view partOf(std::string_view cursor, char key) {
+  while (!cursor.empty()) {
+    const auto part = cursor.substr(0, cursor.find(';'));
+    if (part.starts_with(key)) {
+      return part;
+    }
+    cursor.remove_prefix(std::min(part.size() + 1, cursor.size()));
+  }
+  return {};
+}
+
+/// Whether two entries of different files are one and the same: the system copies entries from file
+/// to file, for instance when the disk becomes writable. Entries of one sequence go by their number
+/// in it, others by boot, times and the hash of their content.
+bool isSameEntry(const EntryBatch::Stamp& left, const EntryBatch::Stamp& right) {
+  const auto equal = [&](char key) {
+    return partOf(left.cursor, key) == partOf(right.cursor, key);
+  };
+  if (left.file == right.file || left.cursor.empty() || right.cursor.empty()) {
+    return false;
+  }
+  return equal('s') ? equal('i') : equal('b') && equal('m') && equal('t') && equal('x');
+}
+
+/// Whether the last entry is one that another file has given already.
 bool isLastACopy(const EntryBatch& batch) {
-  const auto last = batch.size() - 1;
-  const auto& stamp = batch.stampOf(last);
-  for (auto at = last; at-- > 0 && batch.stampOf(at).realtime == stamp.realtime;) {
-    const auto& other = batch.stampOf(at);
-    if (other.file != stamp.file && other.monotonic == stamp.monotonic &&
-        batch.valuesOf(at) == batch.valuesOf(last)) {
+  const auto& last = batch.stampOf(batch.size() - 1);
+  for (auto at = batch.size() - 1; at-- > 0 && batch.stampOf(at).realtime == last.realtime;) {
+    if (isSameEntry(batch.stampOf(at), last)) {
       return true;
     }
   }
@@ -50,8 +71,9 @@ JournalReading::JournalReading(const std::optional<LogFilter>& filter, LogTime f
 
 bool JournalReading::read(EntryBatch& batch) {
   std::uint64_t realtime = 0;
-  // Entries of the same time stay in one batch, where copies are found.
-  for (std::size_t steps = 0; (steps < kStepsAtOnce && !batch.isFull()) || isNextAt(realtime);
+  // Entries of a time that several files have stay in one batch, where copies are found.
+  for (std::size_t steps = 0;
+       (steps < kStepsAtOnce && !batch.isFull()) || (sharedTime == realtime && isNextAt(realtime));
        ++steps) {
     if (!current && !takeTurn()) {
       return false;
@@ -71,14 +93,16 @@ bool JournalReading::isComplete() const {
 /// Puts the current file's entry into `batch`, if it can be read and is wanted.
 void JournalReading::readEntry(EntryBatch& batch) {
   auto& file = files[*current];
-  EntryBatch::Stamp stamp{file.realtime(), 0, *current};
-  const bool lastIsOfSameTime =
-      !batch.isEmpty() && batch.stampOf(batch.size() - 1).realtime == stamp.realtime;
-  const bool nextIsOfSameTime = !turns.empty() && turns.front().realtime == stamp.realtime;
-  if (lastIsOfSameTime || nextIsOfSameTime) {
-    stamp.monotonic = file.monotonic();
+  EntryBatch::Stamp stamp{file.realtime(), *current, {}};
+  if (!turns.empty() && turns.front().realtime == stamp.realtime) {
+    sharedTime = stamp.realtime;
   }
-  if (file.read(stamp, batch) && (!isWanted(batch) || (lastIsOfSameTime && isLastACopy(batch)))) {
+  const bool mayBeACopy = sharedTime == stamp.realtime;
+  if (mayBeACopy) {
+    stamp.cursor = file.cursor();
+  }
+  if (file.read(std::move(stamp), batch) &&
+      (!isWanted(batch) || (mayBeACopy && isLastACopy(batch)))) {
     batch.dropLast();
   }
 }

@@ -39,7 +39,8 @@ class JournalReading {
   LogSelection selection;
   LogTime start;
   std::vector<JournalFileScan> files;
-  std::vector<Turn> turns;             ///< A heap, the next turn in front.
-  std::optional<std::size_t> current;  ///< The file whose turn it is.
+  std::vector<Turn> turns;                  ///< A heap, the next turn in front.
+  std::optional<std::size_t> current;       ///< The file whose turn it is.
+  std::optional<std::uint64_t> sharedTime;  ///< The last time of which several files had entries.
   bool allOpened = true;
 };

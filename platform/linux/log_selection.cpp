@@ -9,6 +9,7 @@ namespace {
 
 /// Programs say what their image path is, so there is no end to how many they can make up.
 constexpr std::size_t kMostVerdicts = 4096;
+constexpr std::size_t kLongestKnownPath = 4096;
 
 }  // namespace
 
@@ -42,6 +43,9 @@ bool LogSelection::selectsImagePath(std::string_view imagePath) const {
   }
   if (const auto known = pathVerdicts.find(imagePath); known != pathVerdicts.end()) {
     return known->second;
+  }
+  if (imagePath.size() > kLongestKnownPath) {
+    return containsPathText(imagePath);
   }
   if (pathVerdicts.size() >= kMostVerdicts) {
     pathVerdicts.clear();

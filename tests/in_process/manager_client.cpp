@@ -39,6 +39,9 @@ constexpr std::int32_t kStatusBusFailure = 1;
 /// they are let go by hand.
 class Clients {
  public:
+  Clients() = default;
+  Clients(const Clients&) = delete;
+  Clients& operator=(const Clients&) = delete;
   ~Clients() { close(); }
 
   void close() {

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <string>
 #include <vector>
@@ -98,6 +99,40 @@ TEST(ExportSelection, GivesTheOldestFirstAcrossFiles) {
                              device.journals().string() + ".other/system.journal");
   std::filesystem::create_directories(device.journals() / "folder.journal");
   EXPECT_EQ(messagesOf(device.run().content), "a b c d e f g h i j k ");
+}
+
+TEST(ExportSelection, KeepsDifferentEntriesOfOneTime) {
+  DeviceJournal device;
+  constexpr int kEach = 400;
+  for (const auto* name : {"system", "user-1000"}) {
+    std::vector<StoredEntry> entries;
+    for (int at = 0; at < kEach; ++at) {
+      entries.push_back(message(kTime, name + std::to_string(at)));
+    }
+    device.store(std::string(name) + ".journal", entries);
+  }
+  std::filesystem::copy_file(device.journals() / "system.journal",
+                             device.journals() / "system@copy.journal~");
+  const auto content = device.run().content;
+  EXPECT_EQ(std::count(content.begin(), content.end(), '\n'), 2 * kEach);
+  for (int at = 0; at < kEach; ++at) {
+    EXPECT_NE(content.find("] system" + std::to_string(at) + "\n"), std::string::npos) << at;
+  }
+}
+
+TEST(ExportSelection, SaysWhenThereAreTooManyFilesToOpen) {
+  DeviceJournal device;
+  device.store("system.journal", {message(kTime, "one")});
+  for (int copy = 0; copy < 40; ++copy) {
+    std::filesystem::copy_file(
+        device.journals() / "system.journal",
+        device.journals() / ("system@" + std::to_string(copy) + ".journal~"));
+  }
+  const auto result =
+      device.runWords({kAllOfHistory, device.output(), "-p"}, "UTC0", {PRLIMIT, "--nofile=32"});
+  EXPECT_EQ(messagesOf(result.content), "one ");
+  EXPECT_EQ(result.messages,
+            (std::vector<std::string>{startedMessage(), "Invalid oslog stream: reason = 1"}));
 }
 
 TEST(ExportSelection, StartsAtTheHistory) {

@@ -106,6 +106,10 @@ TEST(LiveJournal, EndsAtWhatWasStoredAtItsStart) {
     EXPECT_EQ(countOf(content, "] old"), kStored);
     EXPECT_EQ(countOf(content, "] new"), before);
   }
+  // Nor does what is added meanwhile look like damage.
+  for (const auto& message : device.messages()) {
+    EXPECT_EQ(message.find("Invalid"), std::string::npos) << message;
+  }
 }
 
 TEST(LiveJournal, IsReadToItsEndWhenItIsRotatedAway) {
