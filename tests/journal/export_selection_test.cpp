@@ -106,6 +106,7 @@ TEST(ExportSelection, KeepsDifferentEntriesOfOneTime) {
   constexpr int kEach = 400;
   for (const auto* name : {"system", "user-1000"}) {
     std::vector<StoredEntry> entries;
+    entries.reserve(kEach);
     for (int at = 0; at < kEach; ++at) {
       entries.push_back(message(kTime, name + std::to_string(at)));
     }
