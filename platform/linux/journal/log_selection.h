@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/journal_fields.h"
+#include "platform/linux/journal/journal_fields.h"
 #include "platform/log_filter.h"
 
 #include <cstddef>

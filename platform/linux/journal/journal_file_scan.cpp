@@ -1,6 +1,6 @@
-#include "platform/linux/journal_file_scan.h"
+#include "platform/linux/journal/journal_file_scan.h"
 
-#include "platform/linux/journal_index.h"
+#include "platform/linux/journal/journal_index.h"
 
 #include <algorithm>
 #include <cstdlib>

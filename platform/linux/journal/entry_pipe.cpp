@@ -1,4 +1,4 @@
-#include "platform/linux/entry_pipe.h"
+#include "platform/linux/journal/entry_pipe.h"
 
 #include <utility>
 

@@ -1,4 +1,4 @@
-#include "platform/linux/entry_decoder.h"
+#include "platform/linux/journal/entry_decoder.h"
 
 #include "platform/linux/utf8.h"
 

@@ -1,4 +1,4 @@
-#include "platform/linux/machine_time_zone.h"
+#include "platform/linux/journal/machine_time_zone.h"
 
 #include <cstdint>
 #include <ctime>

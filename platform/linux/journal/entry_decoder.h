@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/linux/journal_fields.h"
-#include "platform/linux/machine_time_zone.h"
+#include "platform/linux/journal/journal_fields.h"
+#include "platform/linux/journal/machine_time_zone.h"
 #include "platform/log_entry.h"
 
 #include <array>

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "platform/linux/entry_batch.h"
-#include "platform/linux/journal_file_scan.h"
-#include "platform/linux/log_selection.h"
+#include "platform/linux/journal/entry_batch.h"
+#include "platform/linux/journal/journal_file_scan.h"
+#include "platform/linux/journal/log_selection.h"
 
 #include <cstdint>
 #include <optional>

@@ -1,4 +1,4 @@
-#include "platform/linux/journal_files.h"
+#include "platform/linux/journal/journal_files.h"
 
 #include "platform/linux/file_descriptor.h"
 #include "platform/linux/sysroot.h"

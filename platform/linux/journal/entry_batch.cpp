@@ -1,4 +1,4 @@
-#include "platform/linux/entry_batch.h"
+#include "platform/linux/journal/entry_batch.h"
 
 #include <utility>
 

@@ -1,8 +1,8 @@
 #include "platform/log_store.h"
 
-#include "platform/linux/entry_decoder.h"
-#include "platform/linux/entry_pipe.h"
-#include "platform/linux/journal_reading.h"
+#include "platform/linux/journal/entry_decoder.h"
+#include "platform/linux/journal/entry_pipe.h"
+#include "platform/linux/journal/journal_reading.h"
 
 #include <atomic>
 #include <csignal>

@@ -1,6 +1,6 @@
-#include "platform/linux/log_selection.h"
+#include "platform/linux/journal/log_selection.h"
 
-#include "platform/linux/folded_text.h"
+#include "platform/linux/journal/folded_text.h"
 #include "platform/linux/utf8.h"
 
 #include <algorithm>

@@ -1,9 +1,9 @@
 #pragma once
 
 #include "platform/clock.h"
-#include "platform/linux/entry_batch.h"
-#include "platform/linux/journal_files.h"
-#include "platform/linux/log_selection.h"
+#include "platform/linux/journal/entry_batch.h"
+#include "platform/linux/journal/journal_files.h"
+#include "platform/linux/journal/log_selection.h"
 
 #include <cstdint>
 #include <string>

@@ -1,6 +1,6 @@
-#include "platform/linux/journal_reading.h"
+#include "platform/linux/journal/journal_reading.h"
 
-#include "platform/linux/entry_decoder.h"
+#include "platform/linux/journal/entry_decoder.h"
 
 #include <algorithm>
 #include <functional>

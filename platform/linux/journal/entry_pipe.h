@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/entry_batch.h"
+#include "platform/linux/journal/entry_batch.h"
 
 #include <condition_variable>
 #include <deque>

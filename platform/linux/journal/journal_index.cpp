@@ -1,6 +1,6 @@
-#include "platform/linux/journal_index.h"
+#include "platform/linux/journal/journal_index.h"
 
-#include "platform/linux/journal_fields.h"
+#include "platform/linux/journal/journal_fields.h"
 
 #include <functional>
 #include <string_view>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/log_selection.h"
+#include "platform/linux/journal/log_selection.h"
 
 #include <systemd/sd-journal.h>
 

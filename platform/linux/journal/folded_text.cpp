@@ -1,4 +1,4 @@
-#include "platform/linux/folded_text.h"
+#include "platform/linux/journal/folded_text.h"
 
 #include <utf8proc.h>
 

@@ -1,4 +1,4 @@
-#include "platform/linux/journal_fields.h"
+#include "platform/linux/journal/journal_fields.h"
 
 #include <algorithm>
 
