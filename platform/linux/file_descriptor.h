@@ -1,5 +1,6 @@
 #pragma once
 
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <utility>
@@ -25,6 +26,12 @@ class FileDescriptor {
   explicit operator bool() const { return number >= 0; }
 
   [[nodiscard]] int get() const { return number; }
+
+  /// A second one for the same open file, closed over exec(3); none, and errno is set, when there
+  /// is none to be had.
+  [[nodiscard]] FileDescriptor duplicate() const {
+    return FileDescriptor(fcntl(number, F_DUPFD_CLOEXEC, 0));
+  }
 
   /// Gives up ownership.
   int release() { return std::exchange(number, -1); }

@@ -1,5 +1,6 @@
 // What an export does when the journal or the file is not as it should be.
 
+#include "platform/files.h"
 #include "tests/journal/device_journal.h"
 
 #include <gtest/gtest.h>
@@ -7,7 +8,9 @@
 
 #include <fstream>
 #include <functional>
+#include <iterator>
 #include <random>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -28,6 +31,11 @@ void writeFile(const fs::path& path, const std::string& content) {
   std::ofstream(path, std::ios::binary) << content;
 }
 
+std::string readFile(const fs::path& path) {
+  std::ifstream file(path, std::ios::binary);
+  return {std::istreambuf_iterator<char>(file), {}};
+}
+
 std::string randomBytes(std::size_t count) {
   std::mt19937 random(count);
   std::string bytes(count, '\0');
@@ -37,10 +45,19 @@ std::string randomBytes(std::size_t count) {
   return bytes;
 }
 
+std::size_t linesWith(const std::string& text, const std::string& content) {
+  std::size_t count = 0;
+  std::istringstream lines(content);
+  for (std::string line; std::getline(lines, line);) {
+    count += line.find(text) != std::string::npos ? 1U : 0U;
+  }
+  return count;
+}
+
 /// Overwrites a part of a file.
-void damage(const fs::path& path, std::streamoff start, std::size_t length) {
+void damage(const fs::path& path, std::size_t start, std::size_t length) {
   std::fstream file(path, std::ios::in | std::ios::out | std::ios::binary);
-  file.seekp(start) << randomBytes(length);
+  file.seekp(static_cast<std::streamoff>(start)) << randomBytes(length);
 }
 
 /// Has `words` run by somebody whom the permissions of files bind.
@@ -55,7 +72,7 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
   const struct {
     const char* what;
     std::function<void(const fs::path& journals)> prepare;
-    std::string error;
+    std::string error;  ///< None when what can be read is enough.
   } cases[] = {
       {"missing", [](const fs::path& journals) { fs::remove_all(journals.parent_path()); },
        "No journal files were found"},
@@ -72,6 +89,12 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
       {"no permission to look",
        [](const fs::path& journals) { fs::permissions(journals, fs::perms(0)); },
        "Permission denied"},
+      {"no permission to read one of two",
+       [](const fs::path& journals) {
+         fs::copy_file(journals / "system.journal", journals / "user-1000.journal");
+         fs::permissions(journals / "user-1000.journal", fs::perms(0));
+       },
+       ""},
   };
   for (const auto& each : cases) {
     SCOPED_TRACE(each.what);
@@ -90,10 +113,14 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
     const auto runner = asNobody();
     start.words.insert(start.words.begin(), runner.begin(), runner.end());
     const auto result = TestProcess(start).finish();
-    EXPECT_EQ(result, (ProcessResult{1, "", ""}));
-    EXPECT_EQ(device.messages(), (std::vector<std::string>{"Could not open: " + each.error,
-                                                           "Failed to prepare oslog stream"}));
-    EXPECT_FALSE(fs::exists(device.output()));
+    const bool exported = each.error.empty();
+    EXPECT_EQ(result, (ProcessResult{exported ? 0 : 1, "", ""}));
+    std::vector<std::string> messages = {startedMessage()};
+    if (!exported) {
+      messages = {"Could not open: " + each.error, "Failed to prepare oslog stream"};
+    }
+    EXPECT_EQ(device.messages(), messages);
+    EXPECT_EQ(fs::exists(device.output()), exported);
     std::error_code ignored;
     fs::permissions(device.journals(), fs::perms(0700), ignored);
   }
@@ -101,19 +128,34 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
 
 TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
   DeviceJournal device;
-  device.store("system.journal", entries(20000));
+  auto stored = entries(20000);
+  for (std::size_t at = 0; at < stored.size(); ++at) {
+    stored[at].realtime += at;
+    stored[at].fields.emplace_back("SYSLOG_IDENTIFIER", at % 10 == 0 ? "tenth" : "other");
+  }
+  device.store("system.journal", stored);
   const auto file = device.journals() / "system.journal";
   const auto whole = device.run();
-  ASSERT_EQ(whole.content.size(), 20000 * kLine.size());
+  ASSERT_EQ(linesWith(" m", whole.content), 20000);
 
   const auto size = static_cast<std::size_t>(fs::file_size(file));
-  damage(file, static_cast<std::streamoff>(size / 16), size / 16 * 15);
+  const auto content = readFile(file);
+  damage(file, size / 8 * 5, size / 8 * 3);
   const auto part = device.run();
   EXPECT_EQ(part.status, 0);
   EXPECT_EQ(part.messages,
             (std::vector<std::string>{startedMessage(), "Invalid oslog stream: reason = 1"}));
   EXPECT_LT(part.content.size(), whole.content.size());
   EXPECT_EQ(part.content, whole.content.substr(0, part.content.size()));
+
+  // What the index has lost is found without it.
+  for (std::size_t place = size / 2; place < size / 4 * 3; place += size / 64) {
+    writeFile(file, content);
+    damage(file, place, 4096);
+    const auto expected = linesWith("tenth", device.run().content);
+    EXPECT_GE(linesWith("tenth", device.run({"-p", "tenth"}).content), expected) << place;
+    EXPECT_GT(expected, 1000);
+  }
 
   // A whole file beside it is read all the same.
   device.store("user-1000.journal", entries(10));
@@ -169,6 +211,16 @@ TEST(ExportFailures, TellWhatTheFileIsNotFitFor) {
       EXPECT_EQ(result.content, kThreeLines);
     }
   }
+}
+
+TEST(ExportFailures, WriteAtTheEndOfAFileThatSomebodyEmptied) {
+  const DeviceJournal device;
+  writeFile(device.output(), "before\n");
+  const auto file = WritableFile::open(device.output());
+  ASSERT_FALSE(file->append("one\n"));
+  fs::resize_file(device.output(), 0);
+  ASSERT_FALSE(file->append("two\n"));
+  EXPECT_EQ(fs::file_size(device.output()), 4);
 }
 
 TEST(ExportFailures, KeepANewFileToItsOwner) {

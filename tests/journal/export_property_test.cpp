@@ -104,14 +104,19 @@ ModelEntry makeEntry(Chance& chance, std::uint64_t realtime, const std::string& 
 std::vector<std::vector<ModelEntry>> makeFiles(Chance& chance) {
   constexpr std::uint64_t kTime = 1'620'133'641'000'000;
   std::vector<std::vector<ModelEntry>> files(1 + chance.below(3));
-  const std::size_t longest = chance.below(2) == 0 ? 40 : 400;
+  const std::size_t longest = chance.oneOf<std::size_t>({40, 400, 4000});
   for (std::size_t file = 0; file < files.size(); ++file) {
     std::uint64_t time = kTime + file;
     const auto count = 1 + chance.below(longest);
+    // Where many entries match it is not the index that is gone by, and that changes on the way.
+    std::size_t oneIn = 1;
     for (std::size_t at = 0; at < count; ++at) {
       time += files.size() * chance.below(4);
-      files[file].push_back(
-          makeEntry(chance, time, std::to_string(file) + "." + std::to_string(at)));
+      const auto number = std::to_string(file) + "." + std::to_string(at);
+      oneIn = chance.below(300) == 0 ? 1 + chance.below(60) : oneIn;
+      files[file].push_back(chance.below(oneIn) == 0
+                                ? makeEntry(chance, time, number)
+                                : ModelEntry{{time, {{"MESSAGE", "#" + number}}}, number, {}, {}});
     }
   }
   return files;

@@ -92,9 +92,13 @@ void awaitStored(DeviceJournal& device, const std::string& text, std::size_t cou
 
 TEST(LiveJournal, EndsAtWhatWasStoredAtItsStart) {
   DeviceJournal device;
+  // The export is held up in the first of the two files that are written to no more.
+  constexpr std::size_t kRotated = 2 * kStored;
+  device.store("system@1.journal", entries(kStored, kTime - kRotated, "old"));
+  device.store("system@2.journal", entries(kStored, kTime - kStored, "old"));
   auto storing = device.startStoring("system.journal");
   storing.write(exportFormat(entries(kStored, kTime, "old")));
-  awaitStored(device, "old", kStored);
+  awaitStored(device, "old", kStored + kRotated);
   // Once reading everything, and once with the help of the index.
   for (const auto& selection : {std::vector<std::string>{"-p"}, {"-p", "old", "new"}}) {
     HeldUpExport running(device, selection);
@@ -103,7 +107,7 @@ TEST(LiveJournal, EndsAtWhatWasStoredAtItsStart) {
     awaitStored(device, "new", before + 100);
     const auto content = running.readToEnd();
     EXPECT_EQ(running.status(), 0);
-    EXPECT_EQ(countOf(content, "] old"), kStored);
+    EXPECT_EQ(countOf(content, "] old"), kStored + kRotated);
     EXPECT_EQ(countOf(content, "] new"), before);
   }
   // Nor does what is added meanwhile look like damage.
@@ -123,6 +127,41 @@ TEST(LiveJournal, IsReadToItsEndWhenItIsRotatedAway) {
   fs::remove_all(device.journals());
   EXPECT_EQ(countOf(running.readToEnd(), "] old"), 2 * kStored);
   EXPECT_EQ(running.status(), 0);
+}
+
+TEST(LiveJournal, IsReadAsFarAsItIsThereWhenItIsCutShort) {
+  const std::vector<std::string> everything = {"-p"};
+  const std::vector<std::string> byIndex = {"-p", "old"};
+  const struct {
+    const char* what;
+    std::vector<std::string> selection;
+    std::uintmax_t parts;  ///< Of the file's sixteen, those that are left.
+  } cases[] = {{"in the middle", everything, 10},
+               {"in the middle, of the index", byIndex, 10},
+               {"wholly", everything, 0},
+               {"wholly, with the index", byIndex, 0}};
+  for (const auto& each : cases) {
+    SCOPED_TRACE(each.what);
+    DeviceJournal device;
+    // Few enough of them are selected for the index to be asked, and so many that they are not all
+    // read by the time the export is held up.
+    auto stored = entries(2 * kStored, kTime, "old");
+    for (std::size_t at = 0; at < stored.size(); at += 2) {
+      stored[at].fields.back().second = "/usr/bin/other";
+    }
+    device.store("system.journal", stored);
+    const auto whole = device.run(each.selection).content;
+    device.messages();
+    HeldUpExport running(device, each.selection);
+    const auto file = device.journals() / "system.journal";
+    fs::resize_file(file, fs::file_size(file) / 16 * each.parts);
+    const auto content = running.readToEnd();
+    EXPECT_EQ(running.status(), 0);
+    EXPECT_LT(content.size(), whole.size());
+    EXPECT_EQ(content, whole.substr(0, content.size()));
+    EXPECT_EQ(device.messages(),
+              (std::vector<std::string>{startedMessage(), "Invalid oslog stream: reason = 1"}));
+  }
 }
 
 TEST(LiveJournal, EndsWhenNobodyReadsItsPipeAnyMore) {

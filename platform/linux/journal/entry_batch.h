@@ -15,9 +15,7 @@ class EntryBatch {
   struct Stamp {
     std::uint64_t realtime = 0;
     std::size_t file = 0;
-    std::string cursor;  ///< Empty when nobody asked.
-
-    bool operator==(const Stamp&) const = default;
+    std::string cursor;  ///< Empty when no other file has entries of that time.
   };
 
   /// Starts an entry without values.

@@ -4,7 +4,7 @@
 
 namespace {
 
-constexpr std::size_t kMostFilled = 4;
+constexpr std::size_t kMostFilled = 24;
 
 }  // namespace
 
@@ -13,6 +13,9 @@ bool EntryPipe::push(EntryBatch& batch) {
   changed.wait(lock, [this] { return closed || filled.size() < kMostFilled; });
   if (closed) {
     return false;
+  }
+  if (batch.isEmpty()) {
+    return true;
   }
   filled.push_back(std::move(batch));
   batch = EntryBatch();

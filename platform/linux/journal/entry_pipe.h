@@ -7,12 +7,12 @@
 #include <mutex>
 #include <vector>
 
-/// Carries batches from the thread that reads to the thread that delivers, a few at a time, and the
-/// emptied ones back.
+/// Carries batches from a thread that reads to the thread that delivers, so many at a time that the
+/// one can be ahead of the other, and the emptied ones back.
 class EntryPipe {
  public:
-  /// Hands on `batch` and leaves an empty one in its place; waits for room. False, and the entries
-  /// are gone, when the pipe was closed. By the reading thread.
+  /// Hands on `batch`, unless it is empty, and leaves an empty one in its place; waits for room.
+  /// False, and the entries are gone, when the pipe was closed. By the reading thread.
   bool push(EntryBatch& batch);
 
   /// Says that nothing more will come. By the reading thread.

@@ -1,6 +1,7 @@
 #include "platform/linux/journal/journal_file_scan.h"
 
 #include "platform/linux/journal/journal_index.h"
+#include "platform/linux/journal/lost_pages.h"
 
 #include <algorithm>
 #include <cstdlib>
@@ -38,30 +39,58 @@ bool addMatches(sd_journal* journal, const std::vector<std::string>& matches) {
   });
 }
 
+std::string cursorOf(sd_journal* journal) {
+  char* text = nullptr;
+  if (sd_journal_get_cursor(journal, &text) < 0) {
+    return {};
+  }
+  const std::unique_ptr<char, CharactersReleaser> owner(text);
+  return text;
+}
+
+/// With the index a step costs about 0.3 of a plain one for each match, and without it there is a
+/// step for each entry that is not selected.
+bool isIndexWorthwhile(std::size_t matches, std::size_t steps, std::size_t selected) {
+  return selected * (10 + 3 * matches) < steps * 10;
+}
+
 }  // namespace
 
-JournalFileScan::JournalFileScan(JournalFile file, LogTime from)
-    : journal(std::move(file.journal)),
+JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
+    : file(std::move(found.file)),
+      number(found.number),
+      shared(found.shared),
+      // The journal takes 0 for no time.
       earliest(
-          static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 0))) {
-  std::uint64_t first = 0;
-  std::uint64_t last = 0;
-  const int found = sd_journal_get_cutoff_realtime_usec(journal.get(), &first, &last);
-  currentRealtime = std::max(first, earliest);
-  if (found == 0 || (found > 0 && last < earliest)) {
-    close(true);
-  }
-}
+          static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 1))),
+      currentRealtime(std::max(found.stored.first, earliest)),
+      trusted(found.wasClosed),
+      open(found.stored.holds(currentRealtime)) {}
 
 void JournalFileScan::start(const LogSelection& selection) {
   started = true;
-  damaged = !isTailReadable();
-  const bool mayHaveAny = selection.isEverything() || useIndex(selection);
-  if (mayHaveAny && findEnd() && endRealtime >= earliest && seekStart()) {
-    advance();
-  } else {
+  const auto lostBefore = lostPages();
+  damaged = !reopen() || !isTailReadable();
+  // What has damaged the file's end may have damaged its index.
+  trusted = trusted && !damaged;
+  const bool mayHaveAny =
+      journal && (selection.isEverything() || findMatches(selection)) && findEnd();
+  damaged = damaged || lostPages() != lostBefore;
+  if (journal && !hasJournalFile(journal.get())) {
+    goOnWithoutIndex(0);
+  } else if (!mayHaveAny || endRealtime < earliest) {
     close(true);
+  } else if (sd_journal_flush_matches(journal.get()); !seek(earliest) || !goToNext()) {
+    close(false);
   }
+}
+
+/// Opens the file; it can be done again as long as there are file descriptors to be had.
+bool JournalFileScan::reopen() {
+  auto spare = file.duplicate();
+  journal = openJournal(std::move(file));
+  file = std::move(spare);
+  return journal != nullptr;
 }
 
 /// Whether the library finds the last entry that the file has by its own account, and not, in a
@@ -77,33 +106,16 @@ bool JournalFileScan::isTailReadable() {
   return found == lastBefore || (found > lastBefore && found <= timeOfLast(journal.get()));
 }
 
-/// Restricts the walk to what the index finds. False when it finds that there is nothing.
-bool JournalFileScan::useIndex(const LogSelection& selection) {
-  const auto matches = findIndexMatches(journal.get(), selection);
-  if (matches && matches->empty()) {
-    return false;
+/// Asks the index which entries may be selected, and restricts the journal to them. False when it
+/// finds that there are none. The index of a file that was not closed in good order may lack some.
+bool JournalFileScan::findMatches(const LogSelection& selection) {
+  auto found = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
+  if (found && addMatches(journal.get(), *found)) {
+    matches = std::move(*found);
+    return !matches.empty();
   }
-  if (matches && isIndexWorthwhile(matches->size(), selection) &&
-      !addMatches(journal.get(), *matches)) {
-    sd_journal_flush_matches(journal.get());
-  }
+  sd_journal_flush_matches(journal.get());
   return true;
-}
-
-/// With the index a step costs about 0.3 of a plain one for each match, and without it there is a
-/// step for each entry that is not selected. How many those are shows in the first entries.
-bool JournalFileScan::isIndexWorthwhile(std::size_t matches, const LogSelection& selection) {
-  constexpr std::size_t kAlwaysWorthwhile = 3;
-  constexpr std::size_t kSample = 50;
-  if (matches <= kAlwaysWorthwhile || !seekStart()) {
-    return true;
-  }
-  std::size_t selected = 0;
-  EntryBatch sample;
-  while (sample.size() < kSample && sd_journal_next(journal.get()) > 0 && read({}, sample)) {
-    selected += selection.selects(sample.valuesOf(sample.size() - 1)) ? 1 : 0;
-  }
-  return selected * (10 + 3 * matches) < sample.size() * 10;
 }
 
 /// Notes which entry is the last of the walk.
@@ -112,27 +124,19 @@ bool JournalFileScan::findEnd() {
       sd_journal_get_realtime_usec(journal.get(), &endRealtime) < 0) {
     return false;
   }
-  endCursor = cursor();
-  damaged = damaged || endCursor.empty();
+  endCursor = cursorOf(journal.get());
   return !endCursor.empty();
 }
 
-bool JournalFileScan::seekStart() {
-  return (earliest == 0 ? sd_journal_seek_head(journal.get())
-                        : sd_journal_seek_realtime_usec(journal.get(), earliest)) >= 0;
+bool JournalFileScan::seek(std::uint64_t realtime) {
+  return sd_journal_seek_realtime_usec(journal.get(), realtime) >= 0;
 }
 
-std::string JournalFileScan::cursor() const {
-  char* text = nullptr;
-  if (sd_journal_get_cursor(journal.get(), &text) < 0) {
-    return {};
-  }
-  const std::unique_ptr<char, CharactersReleaser> owner(text);
-  return text;
-}
-
-bool JournalFileScan::read(EntryBatch::Stamp stamp, EntryBatch& batch) {
-  batch.begin(std::move(stamp));
+bool JournalFileScan::read(EntryBatch& batch) {
+  // A cursor is slow to be had, and is there to tell the entries of one time from each other.
+  batch.begin({currentRealtime, number,
+               shared.holds(currentRealtime) ? cursorOf(journal.get()) : std::string()});
+  const auto lostBefore = lostPages();
   const void* data = nullptr;
   std::size_t length = 0;
   sd_journal_restart_data(journal.get());
@@ -140,27 +144,82 @@ bool JournalFileScan::read(EntryBatch::Stamp stamp, EntryBatch& batch) {
   for (; more > 0; more = sd_journal_enumerate_data(journal.get(), &data, &length)) {
     addItem({static_cast<const char*>(data), length}, batch);
   }
-  if (more < 0) {
+  const bool whole = more == 0 && lostPages() == lostBefore;
+  if (!whole) {
     batch.dropLast();
     damaged = true;
   }
-  return more == 0;
+  return whole;
 }
 
-void JournalFileScan::advance() {
+void JournalFileScan::advance(bool selected) {
   if (atEnd) {
     close(true);
-  } else if (sd_journal_next(journal.get()) <= 0 ||
-             sd_journal_get_realtime_usec(journal.get(), &currentRealtime) < 0) {
-    // The end is an entry of the file, and it was not reached.
-    close(false);
+    return;
+  }
+  chooseWay(selected);
+  const auto reached = currentRealtime;
+  const auto lostBefore = lostPages();
+  if (goToNext() && lostPages() == lostBefore) {
+    return;
+  }
+  // The end is an entry of the file, and it was not reached.
+  if (indexed) {
+    goOnWithoutIndex(reached);
   } else {
-    atEnd = currentRealtime == endRealtime &&
-            sd_journal_test_cursor(journal.get(), endCursor.c_str()) > 0;
+    close(false);
+  }
+}
+
+/// Looks at a few entries in a row from time to time, and goes by the index in between when few of
+/// them were selected.
+void JournalFileScan::chooseWay(bool selected) {
+  constexpr unsigned kIndexedSteps = 512;
+  constexpr unsigned kPlainSteps = 32;
+  ++steps;
+  selectedSteps += selected ? 1 : 0;
+  if (matches.empty() || steps < (indexed ? kIndexedSteps : kPlainSteps)) {
+    return;
+  }
+  const bool wasIndexed = indexed;
+  indexed = !wasIndexed && isIndexWorthwhile(matches.size(), steps, selectedSteps) &&
+            addMatches(journal.get(), matches);
+  if (!indexed) {
+    sd_journal_flush_matches(journal.get());
+  }
+  steps = 0;
+  selectedSteps = 0;
+}
+
+bool JournalFileScan::goToNext() {
+  if (sd_journal_next(journal.get()) <= 0 ||
+      sd_journal_get_realtime_usec(journal.get(), &currentRealtime) < 0) {
+    return false;
+  }
+  atEnd = currentRealtime == endRealtime &&
+          sd_journal_test_cursor(journal.get(), endCursor.c_str()) > 0;
+  return true;
+}
+
+/// The index is damaged: it ends before the entry that it named as its last, if it can be asked at
+/// all. What it does not show after the time `reached` is found by looking at every entry; to seek
+/// that time in the file would need an index, too.
+void JournalFileScan::goOnWithoutIndex(std::uint64_t reached) {
+  damaged = true;
+  indexed = false;
+  matches.clear();
+  bool found = reopen() && findEnd() && seek(earliest) && goToNext();
+  while (found && currentRealtime <= reached) {
+    found = !atEnd && goToNext();
+  }
+  if (!found) {
+    close(false);
   }
 }
 
 void JournalFileScan::close(bool complete) {
-  damaged = damaged || !complete || !hasJournalFile(journal.get());
+  damaged = damaged || !complete || !journal || !hasJournalFile(journal.get());
+  open = false;
   journal.reset();
+  file = FileDescriptor();
 }

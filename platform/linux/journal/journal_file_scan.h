@@ -7,6 +7,7 @@
 
 #include <cstdint>
 #include <string>
+#include <vector>
 
 /// Walks through the entries of one journal file, from a point in time up to what is stored when
 /// the walk is started, in the order in which they were stored. With the help of the file's index
@@ -14,10 +15,10 @@
 class JournalFileScan {
  public:
   /// A walk that is not started.
-  JournalFileScan(JournalFile file, LogTime from);
+  JournalFileScan(JournalFile found, LogTime from);
 
   /// Whether there may be entries to come. When there are none, the file is closed.
-  [[nodiscard]] bool isOpen() const { return journal != nullptr; }
+  [[nodiscard]] bool isOpen() const { return open; }
 
   [[nodiscard]] bool isStarted() const { return started; }
 
@@ -31,29 +32,37 @@ class JournalFileScan {
   /// no later than its first entry. It never goes back, but in a file whose machine's clock did.
   [[nodiscard]] std::uint64_t realtime() const { return currentRealtime; }
 
-  /// The cursor of that entry, see sd_journal_get_cursor(3); empty when there is none to be had.
-  [[nodiscard]] std::string cursor() const;
+  /// Puts the entry into `batch`. False, with nothing put there, when it cannot be read.
+  bool read(EntryBatch& batch);
 
-  /// Puts the entry into `batch`, under `stamp`. False, with nothing put there, when it cannot be
-  /// read.
-  bool read(EntryBatch::Stamp stamp, EntryBatch& batch);
-
-  /// Goes to the next entry.
-  void advance();
+  /// Goes to the next entry. `selected` tells whether the one it leaves was.
+  void advance(bool selected);
 
  private:
+  bool reopen();
   bool isTailReadable();
-  bool useIndex(const LogSelection& selection);
-  bool isIndexWorthwhile(std::size_t matches, const LogSelection& selection);
+  bool findMatches(const LogSelection& selection);
   bool findEnd();
-  bool seekStart();
+  bool seek(std::uint64_t realtime);
+  void chooseWay(bool selected);
+  bool goToNext();
+  void goOnWithoutIndex(std::uint64_t reached);
   void close(bool complete);
 
+  FileDescriptor file;
   JournalPtr journal;
-  std::uint64_t earliest = 0;  ///< Where to start.
-  std::uint64_t currentRealtime = 0;
+  std::size_t number;
+  TimeSpan shared;
+  std::uint64_t earliest;  ///< Where to start.
+  std::uint64_t currentRealtime;
   std::uint64_t endRealtime = 0;
   std::string endCursor;
+  std::vector<std::string> matches;  ///< What the index can be asked for; none when it cannot be.
+  bool trusted;                      ///< Whether the index can be expected to be complete.
+  bool indexed = false;              ///< Whether steps go by the index, or else to every entry.
+  unsigned steps = 0;                ///< Since that was decided.
+  unsigned selectedSteps = 0;        ///< Those of them that left a selected entry.
+  bool open;
   bool started = false;
   bool atEnd = false;  ///< Whether the walk is at the last entry.
   bool damaged = false;

@@ -1,12 +1,15 @@
 #include "platform/linux/journal/journal_files.h"
 
-#include "platform/linux/file_descriptor.h"
+#include "platform/linux/journal/lost_pages.h"
 #include "platform/linux/sysroot.h"
 
 #include <fcntl.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <systemd/sd-id128.h>
 
+#include <algorithm>
+#include <array>
 #include <cerrno>
 #include <filesystem>
 #include <set>
@@ -54,64 +57,87 @@ bool isLiveFile(std::string_view name) {
   return name.find('@') == std::string_view::npos;
 }
 
-class Opener {
+/// When the entries of a file were stored, by its own account.
+TimeSpan spanOf(sd_journal* journal, bool grows) {
+  std::uint64_t first = 0;
+  std::uint64_t last = 0;
+  const int found = sd_journal_get_cutoff_realtime_usec(journal, &first, &last);
+  if (found == 0) {
+    return {};
+  }
+  const auto endOfTime = std::numeric_limits<std::uint64_t>::max();
+  // A clock that was set back can have put the last entry before the first.
+  return found < 0 ? TimeSpan{0, endOfTime}
+                   : TimeSpan{std::min(first, last), grows ? endOfTime : std::max(first, last)};
+}
+
+/// File descriptors that are held back while files are found, so that however many there are, some
+/// are left for what the process does with them.
+class HeldBackDescriptors {
  public:
-  explicit Opener(std::size_t most) : atMost(most) {}
+  HeldBackDescriptors() {
+    for (auto& one : descriptors) {
+      one = FileDescriptor(open("/dev/null", O_RDONLY | O_CLOEXEC));
+    }
+  }
+
+ private:
+  std::array<FileDescriptor, 8> descriptors;
+};
+
+class Finder {
+ public:
+  explicit Finder(std::size_t most) : atMost(most) {}
 
   /// Opens what is there and not open yet. Returns whether that was anything.
-  bool openNewFiles() {
+  bool findNewFiles() {
     const auto before = known.size();
     for (const auto* base : {"var/log/journal", "run/log/journal"}) {
       const Folder folder(sysroot() / base);
       noteUnopened(folder.error);
-      openFilesOf(folder);
+      findFilesOf(folder);
       for (const auto& path : folder.contents) {
         if (isJournalFolder(path.filename())) {
           const Folder machine(path);
           noteUnopened(machine.error);
-          openFilesOf(machine);
+          findFilesOf(machine);
         }
       }
     }
-    return known.size() > before && files.opened.size() < atMost;
+    return known.size() > before && files.found.size() < atMost;
   }
 
   JournalFiles files;
 
  private:
-  void openFilesOf(const Folder& folder) {
+  void findFilesOf(const Folder& folder) {
     for (const auto& path : folder.contents) {
-      if (isJournalFile(path.filename().native()) && files.opened.size() < atMost) {
-        openFile(path);
+      if (isJournalFile(path.filename().native()) && files.found.size() < atMost) {
+        findFile(path);
       }
     }
   }
 
-  void openFile(const std::filesystem::path& path) {
+  void findFile(const std::filesystem::path& path) {
     FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     struct stat status {};
     if (!file || fstat(file.get(), &status) != 0) {
       noteUnopened(errno);
-      return;
-    }
-    if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
-      // An empty file is one that is just being made.
-      files.damaged = (!openJournal(path, file) && status.st_size > 0) || files.damaged;
+    } else if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
+      noteFile(path.filename().native(), std::move(file), status.st_size > 0);
     }
   }
 
-  bool openJournal(const std::filesystem::path& path, FileDescriptor& file) {
-    sd_journal* opened = nullptr;
-    int number = file.get();
-    const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);
-    if (result < 0) {
-      note(-result);
-      return false;
+  void noteFile(std::string_view name, FileDescriptor file, bool hasContent) {
+    if (const auto journal = openJournal(file.duplicate())) {
+      const bool grows = isLiveFile(name);
+      files.found.push_back(
+          {std::move(file), grows, !name.ends_with('~'), spanOf(journal.get(), grows), {}, 0});
+    } else {
+      note(errno);
+      // An empty file is one that is just being made.
+      files.damaged = files.damaged || hasContent;
     }
-    file.release();
-    sd_journal_set_data_threshold(opened, 0);
-    files.opened.push_back({JournalPtr(opened), isLiveFile(path.filename().native())});
-    return true;
   }
 
   /// What is gone was rotated away, and what is forbidden is not the user's to read; for any other
@@ -132,13 +158,65 @@ class Opener {
   std::set<std::pair<dev_t, ino_t>> known;
 };
 
+/// Notes which times each of the files, which are in the order of their first entries, has in
+/// common with others.
+void findSharedTimes(std::vector<JournalFile>& files) {
+  for (auto file = files.begin(); file != files.end(); ++file) {
+    for (auto later = file + 1; later != files.end() && later->stored.first <= file->stored.last;
+         ++later) {
+      for (auto* shared : {&file->shared, &later->shared}) {
+        shared->first = std::min(shared->first, later->stored.first);
+        shared->last = std::max(shared->last, std::min(file->stored.last, later->stored.last));
+      }
+    }
+  }
+}
+
+/// Every journal file is open while it waits to be read, and there may be more of them than the
+/// usual limit allows, which is meant for programs that use select(2).
+void liftFileLimit() {
+  struct rlimit limit {};
+  if (getrlimit(RLIMIT_NOFILE, &limit) == 0 && limit.rlim_cur < limit.rlim_max) {
+    limit.rlim_cur = limit.rlim_max;
+    setrlimit(RLIMIT_NOFILE, &limit);
+  }
+}
+
 }  // namespace
 
-JournalFiles openJournalFiles(std::size_t atMost) {
-  Opener opener(atMost);
-  while (opener.openNewFiles()) {
+JournalFiles findJournalFiles(std::size_t atMost) {
+  liftFileLimit();
+  const HeldBackDescriptors heldBack;
+  Finder finder(atMost);
+  while (finder.findNewFiles()) {
   }
-  return std::move(opener.files);
+  auto& found = finder.files.found;
+  std::stable_sort(found.begin(), found.end(),
+                   [](const JournalFile& left, const JournalFile& right) {
+                     return left.stored.first < right.stored.first;
+                   });
+  for (std::size_t number = 0; number < found.size(); ++number) {
+    found[number].number = number;
+  }
+  findSharedTimes(found);
+  return std::move(finder.files);
+}
+
+JournalPtr openJournal(FileDescriptor file) {
+  surviveLostPages();
+  sd_journal* opened = nullptr;
+  int number = file.get();
+  if (number < 0) {
+    return nullptr;
+  }
+  const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);
+  if (result < 0) {
+    errno = -result;
+    return nullptr;
+  }
+  file.release();
+  sd_journal_set_data_threshold(opened, 0);
+  return JournalPtr(opened);
 }
 
 bool hasJournalFile(sd_journal* journal) {

@@ -8,11 +8,13 @@
 #include <optional>
 #include <vector>
 
-/// Reads the selected entries of the device's journals from a point in time up to what is stored
-/// when the reading starts, oldest first across all files. On one thread.
+/// Reads the selected entries of some journal files from a point in time up to what is stored when
+/// the reading is made, oldest first across all the files. On one thread.
 class JournalReading {
  public:
-  JournalReading(const std::optional<LogFilter>& filter, LogTime from);
+  /// A reading of `files`, which are in the order of their first entries.
+  JournalReading(std::vector<JournalFile> files, const std::optional<LogFilter>& filter,
+                 LogTime from);
 
   /// Adds entries to `batch`, none at times: until it is full, or it is time to look around, or all
   /// are read. Returns false in the last case.
@@ -25,22 +27,19 @@ class JournalReading {
   /// A file waits for its turn, which comes when its next entry is the oldest.
   struct Turn {
     std::uint64_t realtime;
-    std::size_t file;
+    std::size_t scan;
     bool operator>(const Turn& other) const;
   };
 
-  void readEntry(EntryBatch& batch);
+  bool readEntry(EntryBatch& batch);
   [[nodiscard]] bool isWanted(const EntryBatch& batch) const;
-  void advance();
+  void advance(bool selected);
   bool takeTurn();
-  void waitForTurn(std::size_t file);
-  [[nodiscard]] bool isNextAt(std::uint64_t realtime) const;
+  void waitForTurn(std::size_t scan);
 
   LogSelection selection;
   LogTime start;
-  std::vector<JournalFileScan> files;
-  std::vector<Turn> turns;                  ///< A heap, the next turn in front.
-  std::optional<std::size_t> current;       ///< The file whose turn it is.
-  std::optional<std::uint64_t> sharedTime;  ///< The last time of which several files had entries.
-  bool allOpened = true;
+  std::vector<JournalFileScan> scans;
+  std::vector<Turn> turns;             ///< A heap, the next turn in front.
+  std::optional<std::size_t> current;  ///< The scan whose turn it is.
 };

@@ -1,12 +1,15 @@
 #include "platform/log_store.h"
 
 #include "platform/linux/journal/entry_decoder.h"
-#include "platform/linux/journal/entry_pipe.h"
-#include "platform/linux/journal/journal_reading.h"
+#include "platform/linux/journal/entry_merge.h"
+#include "platform/linux/journal/reading_thread.h"
 
+#include <array>
 #include <atomic>
 #include <csignal>
 #include <cstring>
+#include <exception>
+#include <list>
 #include <system_error>
 #include <thread>
 #include <utility>
@@ -15,8 +18,8 @@
 class LogSource {};
 
 void LogStore::prepare(const Completion& completion) const {
-  const auto files = openJournalFiles(1);
-  if (!files.opened.empty()) {
+  const auto files = findJournalFiles(1);
+  if (!files.found.empty()) {
     completion(std::make_shared<LogSource>(), std::nullopt);
   } else {
     completion(nullptr, LogStoreError{files.error == 0 ? "No journal files were found"
@@ -28,6 +31,10 @@ namespace {
 
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
+
+/// While the entries of one file are delivered, those of the next are read. More threads would be
+/// ahead of the one that delivers, to no avail.
+constexpr std::size_t kReadingThreads = 2;
 
 /// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
 /// on this thread shows as an error then. Threads started from here on do the same.
@@ -42,8 +49,8 @@ void blockSignals() {
 
 }  // namespace
 
-/// What a reader and its threads share. One thread reads the journals, the other, which is the
-/// reader's own as far as the outside goes, delivers.
+/// What a reader and its threads share. Some read journal files, and the one that is the reader's
+/// own, as far as the outside goes, delivers.
 class LogReader::Session {
  public:
   /// `self` owns this; the thread keeps it until it has run out.
@@ -61,13 +68,13 @@ class LogReader::Session {
  private:
   void run(LogTime from);
   unsigned long deliverAll(LogTime from);
-  void deliver(const EntryBatch& batch);
-  bool readIntoPipe(LogTime from);
+  bool readAll(LogTime from);
+  void deliver(const JournalValues& values, std::uint64_t realtime);
   void end(unsigned long reason);
 
   LogTime position;  ///< Belongs to the delivering thread once it is started.
   EntryDecoder decoder;
-  EntryPipe pipe;
+  std::array<EntryPipe, kReadingThreads> pipes;
   std::atomic<bool> stopped = false;
   std::atomic<bool> ended = false;
   std::thread delivering;
@@ -84,7 +91,9 @@ void LogReader::Session::start(const std::shared_ptr<Session>& self, LogTime fro
 
 void LogReader::Session::stop() {
   stopped = true;
-  pipe.close();
+  for (auto& pipe : pipes) {
+    pipe.close();
+  }
 }
 
 void LogReader::Session::release() {
@@ -116,39 +125,43 @@ void LogReader::Session::end(unsigned long reason) {
 unsigned long LogReader::Session::deliverAll(LogTime from) {
   bool complete = false;
   try {
-    std::thread reading([this, from, &complete] { complete = readIntoPipe(from); });
-    EntryBatch batch;
-    while (pipe.pop(batch)) {
-      deliver(batch);
-    }
-    reading.join();
-  } catch (const std::system_error&) {
-    // There is no thread to be had.
+    complete = readAll(from);
+  } catch (const std::exception&) {
+    // There is no thread or no memory to be had.
   }
   return complete ? kLogReaderAtEnd : kLogReaderReadError;
 }
 
-void LogReader::Session::deliver(const EntryBatch& batch) {
-  for (std::size_t at = 0; at < batch.size() && !stopped; ++at) {
-    const auto entry = decoder.decode(batch.valuesOf(at), batch.stampOf(at).realtime);
-    position = entry.time;
-    if (entryHandler) {
-      entryHandler(entry);
-    }
+/// Reads and delivers everything, or until the reader is stopped. Returns whether nothing is
+/// missing.
+bool LogReader::Session::readAll(LogTime from) {
+  auto files = findJournalFiles();
+  // Files that follow each other are read at the same time.
+  std::array<std::vector<JournalFile>, kReadingThreads> shares;
+  for (auto& file : files.found) {
+    shares.at(file.number % kReadingThreads).push_back(std::move(file));
   }
+  std::list<ReadingThread> threads;
+  for (std::size_t share = 0; share < kReadingThreads; ++share) {
+    threads.emplace_back(std::move(shares.at(share)), filter, from, pipes.at(share));
+  }
+  EntryMerge entries(pipes);
+  while (!stopped && entries.next()) {
+    deliver(entries.values(), entries.realtime());
+  }
+  bool complete = !files.damaged;
+  for (auto& thread : threads) {
+    complete = thread.finish() && complete;
+  }
+  return complete;
 }
 
-/// Reads everything, or until the reader is stopped. Returns whether nothing is missing.
-bool LogReader::Session::readIntoPipe(LogTime from) {
-  JournalReading reading(filter, from);
-  EntryBatch batch;
-  bool more = true;
-  while (more && !stopped) {
-    more = reading.read(batch);
-    more = (batch.isEmpty() || pipe.push(batch)) && more;
+void LogReader::Session::deliver(const JournalValues& values, std::uint64_t realtime) {
+  const auto entry = decoder.decode(values, realtime);
+  position = entry.time;
+  if (entryHandler) {
+    entryHandler(entry);
   }
-  pipe.finish();
-  return reading.isComplete();
 }
 
 LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/)
