@@ -1,8 +1,6 @@
 #pragma once
 
-#include "platform/linux/device_profile.h"
-#include "platform/message_dict.h"
-#include "simulator/device_model.h"
+#include "platform/manager_client.h"
 
 #include <string>
 #include <vector>
@@ -12,24 +10,15 @@ namespace in_process {
 
 /// What a test sets before it acts, and reads after it has acted.
 struct Device {
-  simulator::DeviceModel model;
-  DeviceProfile profile;
-  bool managerRuns = true;
+  int productCode = 0;
+  int radioVendor = 0;
   std::string programName = "velltool";
+  std::string traceProperty;             ///< The manager's answer to any synchronous command.
   std::vector<std::string> clientCalls;  ///< What was done to the client of the manager.
+  vell::client::EventHandler handler;    ///< The one that was registered with it.
 };
 
 /// The device there is.
-Device& device();
-
-/// Puts a new device, of a profile in the simulator's format, in place of the one there is. A
-/// profile that cannot be read ends the test program.
-Device& startDevice(const std::string& profileText);
-
-/// Lets go of the clients of the device there is.
-void closeClients();
-
-/// Has the manager send an event to every client, and returns when it has been handled.
-void sendEvent(const std::string& name, const MessageDict& payload);
+inline Device device;
 
 }  // namespace in_process

@@ -5,56 +5,46 @@
 
 #include <gtest/gtest.h>
 
+#include <list>
 #include <string>
 #include <vector>
 
 namespace {
 
-using in_process::startLogDevice;
-using Words = std::list<std::string>;
+using in_process::logDevice;
 
-struct WordCase {
-  const char* what;
-  Words words;
-  std::vector<std::string> processes;
-  std::vector<std::string> imagePaths;
-};
-
-LogFilter filterOf(const WordCase& expected) {
-  LogFilter filter;
-  for (const auto& name : expected.processes) {
-    filter.push_back({LogComparison::Kind::ProcessEquals, name});
-  }
-  for (const auto& text : expected.imagePaths) {
-    filter.push_back({LogComparison::Kind::SenderImagePathContains, text});
-  }
-  return filter;
+/// Runs the handler on a new device and leaves its group.
+bool exportWith(std::list<std::string> words, const WorkGroup& group = WorkGroup::create()) {
+  logDevice = {};
+  const bool result = makeOsLogHandler()(group, std::move(words));
+  group.wait();
+  return result;
 }
 
 TEST(OsLogHandler, SortsItsWordsIntoTheSelection) {
-  const WordCase cases[] = {
-      {"nothing: the default",
-       {},
-       {"Linkward", "LinkwardMobileHelper", "LinkwardRootHelper", "vell-helper", "Airgroved",
-        "Tessfield", "voltkeeperd"},
-       {"HaldenBaseband"}},
-      {"both", {"-p", "A", "B", "-i", "C", "D"}, {"A", "B"}, {"C", "D"}},
-      {"an option twice", {"-p", "A", "-i", "C", "-p", "B"}, {"A", "B"}, {"C"}},
-      {"words before an option", {"foo", "-p", "A", "B", "-x", "C", "-i", "D"}, {"A", "B"}, {"D"}},
-      {"a word stuck to an option", {"-pA", "B", "-i", "D", "-ip", "E", "-", "F"}, {}, {"D"}},
-      {"an empty word", {"-p", "", "-P", "A"}, {""}, {}},
-      {"an option alone", {"-p"}, {}, {}},
-      {"no option", {"foo", "bar"}, {}, {}},
-  };
-  for (const auto& each : cases) {
-    SCOPED_TRACE(each.what);
-    auto& device = startLogDevice();
-    auto words = each.words;
+  // The words, and the process names and image paths that they select.
+  const std::pair<std::list<std::string>, std::string> cases[] = {
+      {{},
+       "p Linkward, p LinkwardMobileHelper, p LinkwardRootHelper, p vell-helper, p Airgroved, "
+       "p Tessfield, p voltkeeperd, i HaldenBaseband, "},
+      {{"-p", "A", "B", "-i", "C", "D"}, "p A, p B, i C, i D, "},
+      {{"-p", "A", "-i", "C", "-p", "B"}, "p A, p B, i C, "},
+      {{"foo", "-p", "A", "B", "-x", "C", "-i", "D"}, "p A, p B, i D, "},
+      {{"-pA", "B", "-i", "D", "-ip", "E", "-", "F"}, "i D, "},
+      {{"-p", "", "-P", "A"}, "p , "},
+      {{"-p"}, ""},
+      {{"foo", "bar"}, ""}};
+  for (auto [words, selection] : cases) {
+    SCOPED_TRACE(testing::PrintToString(words));
     words.insert(words.begin(), {"60", "out.txt"});
     const Console console;
-    EXPECT_TRUE(makeOsLogHandler()(WorkGroup(), words));
-    EXPECT_EQ(device.filter.value_or(LogFilter()), filterOf(each));
-    EXPECT_EQ(device.files, (std::map<std::string, std::string>{{"out.txt", ""}}));
+    EXPECT_TRUE(exportWith(words));
+    std::string selected;
+    for (const auto& [kind, text] : logDevice.filter) {
+      selected += (kind == LogComparison::Kind::ProcessEquals ? "p " : "i ") + text + ", ";
+    }
+    EXPECT_EQ(selected, selection);
+    EXPECT_EQ(logDevice.files, (std::map<std::string, std::string>{{"out.txt", ""}}));
     EXPECT_EQ(console.output() + console.errors(), "");
   }
 }
@@ -71,34 +61,20 @@ TEST(OsLogHandler, ReadsTheHistoryAsFarAsItIsANumber) {
                                                {"-99999999999", -2147483648}};
   for (const auto& [word, seconds] : cases) {
     SCOPED_TRACE(word);
-    auto& device = startLogDevice();
-    EXPECT_TRUE(makeOsLogHandler()(WorkGroup(), {word, "out.txt", "-p"}));
-    EXPECT_EQ(device.from, device.now - std::chrono::seconds(seconds));
+    EXPECT_TRUE(exportWith({word, "out.txt", "-p"}));
+    EXPECT_EQ(logDevice.from, logDevice.now - std::chrono::seconds(seconds));
     EXPECT_EQ(
-        device.messages,
+        logDevice.messages,
         std::vector{"Getting oslog stream: history = " + std::to_string(seconds) + ".000000"});
   }
 }
 
 TEST(OsLogHandler, NeedsAHistoryAndAPath) {
-  for (const auto& words : {Words{}, Words{"60"}}) {
-    auto& device = startLogDevice();
-    const Console console;
-    EXPECT_FALSE(makeOsLogHandler()(WorkGroup(), words));
-    EXPECT_EQ(console.output(), "os log collection: Failed\n");
-    EXPECT_TRUE(device.files.empty());
-    EXPECT_TRUE(device.messages.empty());
-  }
-}
-
-TEST(OsLogHandler, GivesTheExportsResultAndLeavesItsGroup) {
-  auto& device = startLogDevice();
-  const auto group = WorkGroup::create();
-  EXPECT_TRUE(makeOsLogHandler()(group, {"60", "out.txt"}));
-  group.wait();
-  device.storeError = "gone";
-  EXPECT_FALSE(makeOsLogHandler()(group, {"60", "out.txt"}));
-  group.wait();
+  const Console console;
+  EXPECT_FALSE(exportWith({}));
+  EXPECT_FALSE(exportWith({"60"}));
+  EXPECT_EQ(console.output(), "os log collection: Failed\nos log collection: Failed\n");
+  EXPECT_TRUE(logDevice.files.empty() && logDevice.messages.empty());
 }
 
 }  // namespace
