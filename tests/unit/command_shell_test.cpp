@@ -7,84 +7,62 @@
 
 namespace {
 
-/// A tree of two levels whose handlers write what they were called with: `ok`, `no` and `args` on
-/// every level, `deep` below the root, `locked` refused everywhere.
-void addHandlers(PlainNode& node) {
-  for (const bool result : {true, false}) {
-    node.addCommandHandler(
-        result ? "ok" : "no",
-        [result](const WorkGroup&, const std::list<std::string>& args) {
-          std::cout << (result ? "ok" : "no");
-          for (const auto& word : args) {
-            std::cout << "," << word;
-          }
-          std::cout << std::endl;
-          return result;
-        },
-        "");
-  }
-  node.addCommandHandler("locked", handlerThatGives(true), "");
-  node.refusedWord = "locked";
-}
-
+/// A shell over a tree of two levels with the same handlers everywhere, or over none.
 class TestShell : public CommandShell {
+ public:
+  explicit TestShell(bool tree = true) : hasTree(tree) {}
+
+ private:
   std::shared_ptr<CommandBase> createRootCommand() override {
-    return PlainNode::create("t", {}, [](PlainNode& root) {
-      addHandlers(root);
-      root.addChild("deep", [](PlainNode& deep) { addHandlers(deep); });
-      root.addChild("locked", [](PlainNode& locked) { addHandlers(locked); });
-      root.addCommandHandler("locked", nullptr, "");
+    const auto fill = [](PlainNode& node) { node.addHandlers({"ok", "no", "locked"}); };
+    return !hasTree ? nullptr : PlainNode::create("t", {}, [&](PlainNode& root) {
+      fill(root);
+      root.addChild("deep", fill);
+      root.addChild("locked", fill);
+      root.addChild("no", fill);
     });
   }
-};
 
-class ShellWithoutTree : public CommandShell {
-  std::shared_ptr<CommandBase> createRootCommand() override { return nullptr; }
+  const bool hasTree;
 };
 
 /// The help that a node of the tree shows.
 std::string helpOf(const std::string& name) {
-  const bool root = name == "t";
-  return "\nOptions for command '\x1b[32m" + name +
-         "\x1b[39m':\n\n"
+  return "\nOptions for command '\x1b[32m" + name + "\x1b[39m':\n\n" +
          "\t          locked  -  ...\n\n"
          "\t              no  -  ...\n\n"
          "\t              ok  -  ...\n\n" +
-         (root ? "\t            deep  -  [locked|no|ok]\n\n"
-                 "\t          locked  -  [locked|no|ok]\n\n"
-               : "") +
+         (name != "t" ? ""
+                      : "\t            deep  -  [locked|no|ok]\n\n"
+                        "\t          locked  -  [locked|no|ok]\n\n"
+                        "\t              no  -  [locked|no|ok]\n\n") +
          "\t              cd  -  <sub-command>\n"
-         "\t            help\n"
-         "\t            back\n"
-         "\t            quit\n\n";
+         "\t            help\n\t            back\n\t            quit\n\n";
 }
 
 std::string invalid(const std::string& word, const std::string& node) {
   return "\nInvalid command option '\x1b[31m" + word + "\x1b[39m'" + helpOf(node);
 }
 
-struct Case {
-  std::list<std::string> words;
-  std::string output;
-  bool result;
-};
-
 }  // namespace
 
+// clang-format off
+
 TEST(CommandShell, RunsTheWordsOfACommandLine) {
-  const Case cases[] = {
+  const struct {
+    std::list<std::string> words;
+    std::string output;
+    bool result;
+  } cases[] = {
       {{"--"}, "", true},
       {{"ok"}, "ok\n", true},
       {{"no"}, "no\n", false},
       {{"deep", "ok", "a", "", "cd", "help"}, "ok,a,,cd,help\n", true},
-      {{"ok", "1", "--", "no", "2", "--", "ok", "3"}, "ok,1\nno,2\n", false},
-      {{"--", "ok", "--", "--", "deep", "ok", "--"}, "ok\nok\n", true},
-      {{"ok", "---"}, "ok,---\n", true},
-      {{"help"}, helpOf("t"), true},
+      {{"--", "ok", "1", "--", "--", "deep", "no", "---", "--", "ok", "3"}, "ok,1\nno,---\n", false},
+      {{"help", "--", "ok", "--"}, helpOf("t") + "ok\n", true},
       {{"deep", "help"}, helpOf("deep"), true},
       {{"help", "deep"}, invalid("help", "t"), false},
       {{"deep"}, helpOf("deep"), false},
-      {{"nosuch"}, invalid("nosuch", "t"), false},
       {{"OK"}, invalid("OK", "t"), false},
       {{""}, invalid("", "t"), false},
       {{"deep", "nosuch", "ok"}, invalid("nosuch", "deep"), false},
@@ -93,7 +71,7 @@ TEST(CommandShell, RunsTheWordsOfACommandLine) {
       {{"quit", "--", "ok"}, "", true},
       {{"ok", "--", "exit", "--", "no"}, "ok\n", true},
       {{"back", "--", "ok"}, "ok\n", true},
-      {{"locked"}, "", false},
+      {{"locked", "ok"}, "", false},
       {{"deep", "locked", "--", "ok"}, "", false},
       {{"cd"}, helpOf("t"), false},
       {{"cd", "deep", "ok"}, helpOf("t"), false},
@@ -103,42 +81,33 @@ TEST(CommandShell, RunsTheWordsOfACommandLine) {
       {{"cd", "//deep//../locked/.././.."}, helpOf("t"), false},
       {{"cd", "..//deep/../../locked/", "--", "cd", "///", "--", "ok"}, "ok\n", true},
   };
-  for (auto testCase : cases) {
-    std::string line;
-    for (const auto& word : testCase.words) {
-      line += "'" + word + "' ";
-    }
-    SCOPED_TRACE(line);
-    testCase.words.push_front("t");
+  for (auto [words, output, result] : cases) {
+    SCOPED_TRACE(testing::PrintToString(words));
+    words.push_front("t");
     const Console console;
-    EXPECT_EQ(TestShell().run(testCase.words), testCase.result);
-    EXPECT_EQ(console.output(), testCase.output);
+    EXPECT_EQ(TestShell().run(words), result);
+    EXPECT_EQ(console.output(), output);
     EXPECT_EQ(console.errors(), "");
   }
 }
 
 TEST(CommandShell, ReadsLinesUntilTheUserLeaves) {
+  const std::string p = "(/t)>> ";
   const struct {
     std::string input;
     std::string output;
     bool result;
   } cases[] = {
-      {"", "(/t)>> ", false},
-      {"quit\nok\n", "(/t)>> ", true},
-      {"\n \t\v\f\r\n--\nexit", "(/t)>> (/t)>> (/t)>> (/t)>> ", true},
-      {"ok last line", "(/t)>> ok,last,line\n(/t)>> ", false},
-      {"  ok\ta  b\r\n", "(/t)>> ok,a,b\n(/t)>> ", false},
-      {"ok \"a b\" c\\ d\n", "(/t)>> ok,\"a,b\",c\\,d\n(/t)>> ", false},
-      {"no -- ok\nok 1 -- ok 2\n", "(/t)>> no\n(/t)>> ok,1\nok,2\n(/t)>> ", false},
-      {"ok -- quit -- ok\n", "(/t)>> ok\n", true},
-      {"cd deep\nok\nback\nback\nquit\n", "(/t)>> (/t/deep)>> ok\n(/t/deep)>> (/t)>> (/t)>> ",
-       true},
-      {"cd deep/nosuch\nquit\n", "(/t)>> " + helpOf("deep") + "(/t)>> ", true},
-      {"cd locked\ncd ../deep -- ok x -- cd ..\nquit\n", "(/t)>> (/t/locked)>> ok,x\n(/t)>> ",
-       true},
-      {"deep\ndeep back\nquit\n",
-       "(/t)>> " + helpOf("deep") + "(/t)>> " + invalid("back", "deep") + "(/t)>> ", true},
-      {std::string("ok a\0b\n", 7), std::string("(/t)>> ok,a\0b\n(/t)>> ", 21), false},
+      {"", p, false},
+      {"quit\nok\n", p, true},
+      {"\n \t\v\f\r\n--\nexit", p + p + p + p, true},
+      {"  ok\ta  \"b c\\ d\"\r\nok last line", p + "ok,a,\"b,c\\,d\"\n" + p + "ok,last,line\n" + p, false},
+      {"no -- ok\nok 1 -- quit -- ok\n", p + "no\n" + p + "ok,1\n", true},
+      {"cd deep\nok\nback\nback\nquit\n", p + "(/t/deep)>> ok\n(/t/deep)>> " + p + p, true},
+      {"cd deep/nosuch\nquit\n", p + helpOf("deep") + p, true},
+      {"cd locked\ncd ../deep -- ok x -- cd ..\nquit\n", p + "(/t/locked)>> ok,x\n" + p, true},
+      {"deep\ndeep back\nquit\n", p + helpOf("deep") + p + invalid("back", "deep") + p, true},
+      {std::string("ok a\0b\n", 7), p + std::string("ok,a\0b\n", 7) + p, false},
   };
   for (const auto& [input, output, result] : cases) {
     SCOPED_TRACE(input);
@@ -148,23 +117,23 @@ TEST(CommandShell, ReadsLinesUntilTheUserLeaves) {
   }
 }
 
-TEST(CommandShell, ReadsLinesForAnEmptyArgumentList) {
+// clang-format on
+
+TEST(CommandShell, ReadsLinesForAnEmptyArgumentListButNoneWithoutATree) {
   const Console console("quit\n");
+  EXPECT_FALSE(TestShell(false).run({}));
+  EXPECT_EQ(console.output(), "");
   EXPECT_TRUE(TestShell().run({}));
   EXPECT_EQ(console.output(), "(/t)>> ");
 }
 
-TEST(CommandShell, FailsSilentlyWithoutATree) {
-  const Console console("ok\n");
-  EXPECT_FALSE(ShellWithoutTree().run({"t"}));
-  EXPECT_EQ(console.output(), "");
-}
-
 TEST(CommandShell, TakesTheArgumentVectorAsItIs) {
-  std::string words[] = {"/usr/bin/t", "", " a b ", "--"};
-  char* vector[] = {words[0].data(), words[1].data(), words[2].data(), words[3].data(), nullptr};
-  EXPECT_EQ(CommandShell::convertCmdArgsToList(4, vector),
-            (std::list<std::string>{"/usr/bin/t", "", " a b ", "--"}));
-  EXPECT_TRUE(CommandShell::convertCmdArgsToList(0, vector).empty());
+  const std::list<std::string> words = {"/usr/bin/t", "", " a b ", "--"};
+  std::vector<char*> vector;
+  for (const auto& word : words) {
+    vector.push_back(const_cast<char*>(word.c_str()));
+  }
+  EXPECT_EQ(CommandShell::convertCmdArgsToList(4, vector.data()), words);
+  EXPECT_TRUE(CommandShell::convertCmdArgsToList(0, nullptr).empty());
   EXPECT_TRUE(CommandShell::convertCmdArgsToList(-1, nullptr).empty());
 }

@@ -8,29 +8,26 @@
 /// is kept, and standard input is `input`. One at a time, on the thread of the test.
 class Console {
  public:
-  explicit Console(const std::string& input = "")
-      : in(input),
-        realIn(std::cin.rdbuf(in.rdbuf())),
-        realOut(std::cout.rdbuf(out.rdbuf())),
-        realErr(std::cerr.rdbuf(err.rdbuf())) {
-    std::cin.clear();
-  }
+  explicit Console(const std::string& input = "") : in(input) { swapBuffers(); }
   Console(const Console&) = delete;
   Console& operator=(const Console&) = delete;
-  ~Console() {
-    std::cin.rdbuf(realIn);
-    std::cout.rdbuf(realOut);
-    std::cerr.rdbuf(realErr);
-  }
+  ~Console() { swapBuffers(); }
 
   [[nodiscard]] std::string output() const { return out.str(); }
   [[nodiscard]] std::string errors() const { return err.str(); }
 
  private:
+  static void swapBuffers(std::ios& left, std::ios& right) {
+    left.rdbuf(right.rdbuf(left.rdbuf()));
+  }
+
+  void swapBuffers() {
+    swapBuffers(std::cin, in);
+    swapBuffers(std::cout, out);
+    swapBuffers(std::cerr, err);
+  }
+
   std::istringstream in;
   std::ostringstream out;
   std::ostringstream err;
-  std::streambuf* realIn;
-  std::streambuf* realOut;
-  std::streambuf* realErr;
 };

@@ -5,79 +5,53 @@
 
 namespace {
 
-std::string helpOf(const std::shared_ptr<PlainNode>& node) {
+/// That the help of a node of that content is what is between the header and the built-in words.
+void expectHelp(const PlainNode::Fill& content, const std::string& expected) {
   const Console console;
-  node->displayHelp();
-  return console.output();
+  PlainNode::create("n", {}, content)->displayHelp();
+  EXPECT_EQ(console.output(), "\nOptions for command '\x1b[32mn\x1b[39m':\n\n" + expected +
+                                  "\t              cd  -  <sub-command>\n"
+                                  "\t            help\n\t            back\n\t            quit\n\n");
 }
-
-std::string header(const std::string& name) {
-  return "\nOptions for command '\x1b[32m" + name + "\x1b[39m':\n\n";
-}
-
-constexpr const char* kBuiltIns =
-    "\t              cd  -  <sub-command>\n"
-    "\t            help\n"
-    "\t            back\n"
-    "\t            quit\n"
-    "\n";
 
 }  // namespace
 
 TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltIns) {
-  const auto node = PlainNode::create("net", {}, [](PlainNode& self) {
-    self.addCommandHandler("stat", handlerThatGives(true), "");
-    self.addCommandHandler("ping", handlerThatGives(true), "[count] send <probes>|");
-    self.addChild("route", [](PlainNode& route) {
-      route.addCommandHandler("del", handlerThatGives(true), "not shown");
-      route.addCommandHandler("add", handlerThatGives(true), "not shown");
-      route.addChild("cache", [](PlainNode& cache) {
-        cache.addCommandHandler("flush", handlerThatGives(true), "");
-      });
-    });
-  });
-  EXPECT_EQ(helpOf(node), header("net") +
-                              "\t            ping  -  [count] send <probes>|\n"
-                              "\n"
-                              "\t            stat  -  ...\n"
-                              "\n"
-                              "\t           route  -  [add|del]\n"
-                              "\t                     <cache>  -  [flush]\n"
-                              "\n" +
-                              kBuiltIns);
-}
-
-TEST(HelpDisplay, PassesOverNodesWithoutHandlersButNotWhatIsBelow) {
-  const auto node = PlainNode::create("top", {}, [](PlainNode& top) {
-    top.addChild("mid", [](PlainNode& mid) {
-      mid.addChild("leaf", [](PlainNode& leaf) {
-        leaf.addCommandHandler("go", handlerThatGives(true), "");
-      });
-    });
-  });
-  EXPECT_EQ(helpOf(node), header("top") + "\t                     <leaf>  -  [go]\n\n" + kBuiltIns);
-  EXPECT_EQ(helpOf(PlainNode::create("empty", {})), header("empty") + kBuiltIns);
+  expectHelp([](PlainNode&) {}, "");
+  expectHelp(
+      [](PlainNode& node) {
+        node.addHandlers({"stat"});
+        node.addHandlers({"ping"}, "[count] send <probes>|");
+        node.addChild("route", [](PlainNode& route) {
+          route.addHandlers({"del", "add"}, "not shown");
+          route.addChild("cache", [](PlainNode& cache) { cache.addHandlers({"flush"}); });
+        });
+        // A node without handlers is passed over, but not what is below.
+        node.addChild("top", [](PlainNode& top) {
+          top.addChild("leaf", [](PlainNode& leaf) { leaf.addHandlers({"go"}); });
+        });
+      },
+      "\t            ping  -  [count] send <probes>|\n\n"
+      "\t            stat  -  ...\n\n"
+      "\t           route  -  [add|del]\n"
+      "\t                     <cache>  -  [flush]\n\n"
+      "\t                     <leaf>  -  [go]\n\n");
 }
 
 TEST(HelpDisplay, SortsByBytesAndCutsNothing) {
-  const auto node = PlainNode::create("n", {}, [](PlainNode& self) {
-    for (const auto* word : {"telx", "tel", "abc", "Zed", "a_word_of_16_chr", "\xC3\xA4"}) {
-      self.addCommandHandler(word, handlerThatGives(true), "text");
-    }
-    self.addCommandHandler("tel", handlerThatGives(true), "");
-    self.addCommandHandler("abc", handlerThatGives(true), "newer");
-    self.addChild("a_name_of_more_than_16", [](PlainNode& child) {
-      child.addCommandHandler("x|]", handlerThatGives(true), "");
-    });
-  });
-  EXPECT_EQ(helpOf(node), header("n") +
-                              "\t             Zed  -  text\n\n"
-                              "\ta_word_of_16_chr  -  text\n\n"
-                              "\t             abc  -  newer\n\n"
-                              "\t             tel  -  text\n\n"
-                              "\t            telx  -  text\n\n"
-                              "\t              \xC3\xA4  -  text\n\n"
-                              "\ta_name_of_more_than_16  -  [x|]]\n"
-                              "\n" +
-                              kBuiltIns);
+  expectHelp(
+      [](PlainNode& node) {
+        node.addHandlers({"telx", "tel", "abc", "Zed", "a_word_of_16_chr", "\xC3\xA4"}, "text");
+        node.addHandlers({"tel"});
+        node.addHandlers({"abc"}, "newer");
+        node.addChild("a_name_of_more_than_16",
+                      [](PlainNode& child) { child.addHandlers({"x|]"}); });
+      },
+      "\t             Zed  -  text\n\n"
+      "\ta_word_of_16_chr  -  text\n\n"
+      "\t             abc  -  newer\n\n"
+      "\t             tel  -  text\n\n"
+      "\t            telx  -  text\n\n"
+      "\t              \xC3\xA4  -  text\n\n"
+      "\ta_name_of_more_than_16  -  [x|]]\n\n");
 }

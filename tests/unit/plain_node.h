@@ -3,6 +3,9 @@
 #include "framework/command_base.h"
 
 #include <functional>
+#include <initializer_list>
+#include <iostream>
+#include <list>
 #include <memory>
 #include <string>
 #include <utility>
@@ -14,36 +17,39 @@ class PlainNode : public CommandBase {
 
   static std::shared_ptr<PlainNode> create(const std::string& nodeName,
                                            const std::weak_ptr<CommandBase>& parentNode,
-                                           Fill contents = nullptr) {
-    std::shared_ptr<PlainNode> node(new PlainNode(nodeName, parentNode, std::move(contents)));
+                                           Fill contents) {
+    std::shared_ptr<PlainNode> node(new PlainNode(nodeName, parentNode));
+    node->fill = std::move(contents);
     node->init();
     return node;
   }
 
   /// Adds a child of this node, made the way the tool makes its own.
-  void addChild(const std::string& childName, Fill childFill = nullptr) {
+  void addChild(const std::string& childName, Fill childFill) {
     addSubCommand(childName, create(childName, weak_from_this(), std::move(childFill)));
   }
 
-  bool isAllowed(std::string word) override { return word != refusedWord; }
-
-  std::string refusedWord;
-
- private:
-  PlainNode(const std::string& nodeName, const std::weak_ptr<CommandBase>& parentNode,
-            Fill contents)
-      : CommandBase(nodeName, parentNode), fill(std::move(contents)) {}
-
-  void registerCommands() override {
-    if (fill) {
-      fill(*this);
+  /// Adds handlers that write their own word and what they were called with; only "no" fails.
+  void addHandlers(std::initializer_list<std::string> words, const std::string& help = "") {
+    for (const auto& word : words) {
+      const auto handler = [word](const WorkGroup&, const std::list<std::string>& args) {
+        std::cout << word;
+        for (const auto& argument : args) {
+          std::cout << "," << argument;
+        }
+        std::cout << std::endl;
+        return word != "no";
+      };
+      addCommandHandler(word, handler, help);
     }
   }
 
-  const Fill fill;
-};
+  bool isAllowed(std::string word) override { return word != "locked"; }
 
-/// A handler that does nothing and has this result.
-inline CommandHandler handlerThatGives(bool result) {
-  return [result](const WorkGroup&, const std::list<std::string>&) { return result; };
-}
+ private:
+  using CommandBase::CommandBase;
+
+  void registerCommands() override { fill(*this); }
+
+  Fill fill;
+};

@@ -3,8 +3,8 @@
 #include "platform/linux/device_profile.h"
 
 #include <gtest/gtest.h>
-#include <sys/stat.h>
 
+#include <cstdlib>
 #include <fstream>
 
 namespace {
@@ -21,44 +21,44 @@ std::string describe(const SettingsFile& file) {
   return text;
 }
 
-constexpr const char* kBadQuotes = ": value is not quoted as it must be ";
+std::string describe(const DeviceProfile& profile) {
+  return testing::PrintToString(
+      std::tuple(profile.radioType, profile.productCode, profile.radioVendor, profile.radioDiagQdss,
+                 profile.internalBuild, profile.carrierBuild, profile.defaultCompression,
+                 profile.compressionSupported));
+}
 
 }  // namespace
 
 TEST(SettingsFile, ReadsLinesOfKeyAndValue) {
-  const struct {
-    std::string text;
-    std::string expected;
-  } cases[] = {
+  const std::string badQuotes = "A: value is not quoted as it must be ";
+  const std::pair<std::string, std::string> cases[] = {
       {"", ""},
       {"\n  # A=1\n#\n \t\n", ""},
       {"A=1\n  B_2.c=x=y  \r\nA=", "3:A=[] 2:B_2.c=[x=y] "},
       {"A='a \"b\" \\ # c'\nB=\"a 'b' \\\" \\$ \\\\\"",
        "1:A=[a \"b\" \\ # c] 2:B=[a 'b' \" $ \\] "},
       {"A=''\nB=\"\"", "1:A=[] 2:B=[] "},
-      {"A='x\nB=ok", "2:B=[ok] !1:A" + std::string(kBadQuotes)},
-      {"A=\"x\\\"", "!1:A" + std::string(kBadQuotes)},
-      {"A='x' y", "!1:A" + std::string(kBadQuotes)},
-      {"A=x y", "!1:A" + std::string(kBadQuotes)},
+      {"A=1\nA='x\nB=ok", "3:B=[ok] !2:" + badQuotes},
+      {"A=\"x\\\"", "!1:" + badQuotes},
+      {"A='x' y", "!1:" + badQuotes},
+      {"A=x y", "!1:" + badQuotes},
       {"nonsense\n=x\nA B=1\n\xFF\xFE=1",
        "!1:not a KEY=value line !2:not a KEY=value line !3:not a KEY=value line "
        "!4:not a KEY=value line "},
-      {std::string("A=x\0y", 5), "1:A=[" + std::string("x\0y", 3) + "] "},
-  };
+      {std::string("A=x\0y", 5), std::string("1:A=[x\0y] ", 10)}};
   for (const auto& [text, expected] : cases) {
     EXPECT_EQ(describe(SettingsFile::parse(text)), expected) << text;
   }
 }
 
 TEST(SettingsFile, TellsAMissingFileFromAnUnreadableOne) {
-  const auto folder = testing::TempDir() + "settings" + std::to_string(getpid());
-  ASSERT_EQ(mkdir(folder.c_str(), 0700), 0);
+  std::string folder = testing::TempDir() + "settings-XXXXXX";
+  ASSERT_NE(mkdtemp(folder.data()), nullptr);
   EXPECT_FALSE(SettingsFile::read(folder + "/missing").has_value());
-  const auto unreadable = SettingsFile::read(folder);
-  ASSERT_TRUE(unreadable.has_value());
-  EXPECT_EQ(describe(*unreadable), "!0:not a file ");
+  EXPECT_EQ(describe(SettingsFile::read(folder).value()), "!0:not a file ");
   std::ofstream(folder + "/there") << "A=1";
-  EXPECT_EQ(describe(*SettingsFile::read(folder + "/there")), "1:A=[1] ");
+  EXPECT_EQ(describe(SettingsFile::read(folder + "/there").value()), "1:A=[1] ");
   std::filesystem::remove_all(folder);
 }
 
@@ -66,25 +66,14 @@ TEST(DeviceProfile, HasADefaultForWhatIsMissingOrCannotBeRead) {
   auto good = SettingsFile::parse(
       "RADIO_TYPE=-4\nPRODUCT_CODE=58\nRADIO_VENDOR=2\nRADIO_DIAG_QDSS=yes\nINTERNAL_BUILD=yes\n"
       "CARRIER_BUILD=yes\nDEFAULT_COMPRESSION=-9000000000\nCOMPRESSION_SUPPORTED=no\nOTHER=x\n");
-  const auto profile = DeviceProfile::from(good);
+  EXPECT_EQ(describe(DeviceProfile::from(good)),
+            "(-4, 58, 2, true, true, true, -9000000000, false)");
   EXPECT_TRUE(good.faults.empty());
-  EXPECT_EQ(profile.radioType, -4);
-  EXPECT_EQ(profile.productCode, 58);
-  EXPECT_EQ(profile.radioVendor, 2);
-  EXPECT_TRUE(profile.radioDiagQdss && profile.internalBuild && profile.carrierBuild);
-  EXPECT_EQ(profile.defaultCompression, -9000000000);
-  EXPECT_FALSE(profile.compressionSupported);
 
   auto bad = SettingsFile::parse(
       "RADIO_TYPE=1x\nPRODUCT_CODE=\nRADIO_VENDOR=99999999999\nRADIO_DIAG_QDSS=YES\n"
       "DEFAULT_COMPRESSION=zip\nCOMPRESSION_SUPPORTED=0\n");
-  const auto defaults = DeviceProfile::from(bad);
-  EXPECT_EQ(defaults.radioType, 0);
-  EXPECT_EQ(defaults.productCode, 0);
-  EXPECT_EQ(defaults.radioVendor, 0);
-  EXPECT_FALSE(defaults.radioDiagQdss || defaults.internalBuild || defaults.carrierBuild);
-  EXPECT_EQ(defaults.defaultCompression, kCompressionNone);
-  EXPECT_TRUE(defaults.compressionSupported);
+  EXPECT_EQ(describe(DeviceProfile::from(bad)), "(0, 0, 0, false, false, false, 0, true)");
   bad.settings.clear();
   EXPECT_EQ(describe(bad),
             "!1:RADIO_TYPE: '1x' is not an integer !2:PRODUCT_CODE: '' is not an integer "
