@@ -9,12 +9,10 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
-#include <fstream>
 #include <future>
 
 namespace {
 
-using vell::client::CreateManager;
 using vell::client::PerformCommand;
 
 /// A device, and a client of its manager, whose queue can be held up.
@@ -23,26 +21,20 @@ class Client : public testing::Test {
   void start(const std::string& profile) {
     device.emplace(profile);
     setenv("DBUS_SYSTEM_BUS_ADDRESS", device->busAddress().c_str(), 1);
-    manager = CreateManager("test", queue);
+    manager = vell::client::CreateManager("test", queue);
   }
 
   /// The status of a command that the manager answers or does not.
-  std::int32_t statusOf(const char* command) {
+  std::int32_t ask() {
     MessageDict reply;
-    return PerformCommand(manager, command, {}, &reply).status;
+    return PerformCommand(manager, vell::kCommandGetTraceProperty, {}, &reply).status;
   }
 
-  /// Holds the queue up until what this gives is destroyed.
-  std::shared_ptr<void> holdQueue() {
-    const auto gate = std::make_shared<std::promise<void>>();
-    queue.submit([gate, opened = gate->get_future().share()] { opened.wait(); });
-    return {nullptr, [gate](void*) { gate->set_value(); }};
-  }
-
-  void drainQueue() {
-    std::promise<void> drained;
-    queue.submit([&] { drained.set_value(); });
-    drained.get_future().wait();
+  /// Has `work` done on the queue and waits for it.
+  void onQueue(const std::function<void()>& work) const {
+    std::packaged_task<void()> task(work);
+    queue.submit([&] { task(); });
+    task.get_future().wait();
   }
 
   std::vector<std::string> states;  // that events have told of
@@ -55,43 +47,38 @@ class Client : public testing::Test {
 
 TEST_F(Client, AsksSynchronouslyWhileItsQueueIsBusyAndFromItsQueue) {
   start("");
-  auto held = holdQueue();
-  EXPECT_EQ(statusOf(vell::kCommandGetTraceProperty), 0);
-  held.reset();
-  std::promise<std::int32_t> asked;
-  queue.submit([&] { asked.set_value(statusOf(vell::kCommandGetTraceProperty)); });
-  EXPECT_EQ(asked.get_future().get(), 0);
+  std::promise<void> gate;
+  queue.submit([&] { gate.get_future().wait(); });
+  EXPECT_EQ(ask(), 0);
+  gate.set_value();
+  onQueue([&] { EXPECT_EQ(ask(), 0); });
 }
 
 TEST_F(Client, DeliversNothingOnceEventsAreOff) {
   start("MANAGER=absent");
   auto service = device->serve("manager");
   // Anew, so that the coming of the service is no event.
-  manager = CreateManager("test", queue);
+  manager = vell::client::CreateManager("test", queue);
   vell::client::RegisterEventHandler(manager, vell::kEventServerStateChange,
                                      [&](const MessageDict& payload, const WorkGroup&) {
                                        states.push_back(payload.getString(vell::kKeyServerState));
                                      });
   vell::client::EventsOn(manager);
-  EXPECT_EQ(statusOf(vell::kCommandGetTraceProperty), 0);
-  drainQueue();
-  EXPECT_EQ(states, std::vector<std::string>{"Started"});
+  EXPECT_EQ(ask(), 0);
+  onQueue([&] { EXPECT_EQ(states, std::vector<std::string>{"Started"}); });
 
-  auto held = holdQueue();
-  service.write("state Stopped\n");
-  while (!service.readLine().starts_with("Event")) {
-  }
-  // What is answered after the event has come behind it.
-  EXPECT_EQ(statusOf(vell::kCommandGetTraceProperty), 0);
-  vell::client::EventsOff(manager);
-  held.reset();
-  drainQueue();
-  EXPECT_EQ(states, std::vector<std::string>{"Started"});
+  onQueue([&] {
+    service.write("state Stopped\n");
+    service.readUntil("Event");
+    // What is answered after the event has come behind it.
+    EXPECT_EQ(ask(), 0);
+    vell::client::EventsOff(manager);
+  });
+  onQueue([&] { EXPECT_EQ(states, std::vector<std::string>{"Started"}); });
   vell::client::EventsOn(manager);
-  EXPECT_EQ(statusOf(vell::kCommandGetTraceProperty), 0);
-  drainQueue();
+  EXPECT_EQ(ask(), 0);
   // The end of the service is an event, too.
-  vell::client::EventsOff(manager);
+  onQueue([&] { vell::client::EventsOff(manager); });
   EXPECT_EQ(states, (std::vector<std::string>{"Started", "Stopped"}));
 }
 
@@ -109,22 +96,20 @@ TEST_F(Client, AnswersWhatIsOutstandingWhenItGoes) {
       {});
   manager.reset();
   EXPECT_NE(answered.get_future().get(), 0);
-  drainQueue();
-  EXPECT_TRUE(watch.expired());
+  onQueue([&] { EXPECT_TRUE(watch.expired()); });
 }
 
 TEST_F(Client, StartsNoService) {
   start("BUS=no");
   // A bus that would start the manager, and show by another error that it had tried.
-  const auto configuration = device->root() / "run/bus.conf";
-  auto text = contentOf(configuration);
-  text.insert(text.find("  <auth>"),
-              "  <servicedir>" + device->root().string() + "</servicedir>\n");
-  std::ofstream(configuration) << text;
-  std::ofstream(device->root() / "org.vell.Manager1.service")
-      << "[D-BUS Service]\nName=org.vell.Manager1\nExec=/no/such/program\n";
+  EXPECT_EQ(device->runLine(R"(cd "$VELL_SYSROOT"
+      sed -i "s|  <auth>|<servicedir>$PWD</servicedir>&|" run/bus.conf
+      printf '[D-BUS Service]\nName=org.vell.Manager1\nExec=/no/such\n' >manager.service)"),
+            (ProcessResult{0, "", ""}));
   const auto bus = device->serve("bus");
-  EXPECT_EQ(statusOf(vell::kCommandTraceDumpState), vell::kStatusManagerNotRunning);
+  MessageDict reply;
+  EXPECT_EQ(PerformCommand(manager, vell::kCommandTraceDumpState, {}, &reply).status,
+            vell::kStatusManagerNotRunning);
 }
 
 TEST_F(Client, OfTheHelperWaitsForAnAnswerWithinItsTimeLimit) {
@@ -133,13 +118,9 @@ TEST_F(Client, OfTheHelperWaitsForAnAnswerWithinItsTimeLimit) {
     MessageDict request;
     request.set(vell::helper::kKeyTimeout, milliseconds);
     MessageDict reply;
-    const auto start = std::chrono::steady_clock::now();
     const auto result = vell::HelperClient::create("test", nullptr)
                             ->perform(4, vell::helper::kCommandTidewellStatus, request, reply);
-    const auto taken = std::chrono::steady_clock::now() - start;
-    const bool patient = milliseconds == 60000;
-    EXPECT_EQ(result.status == 0, patient);
-    EXPECT_EQ(reply.getString(vell::helper::kKeyTimestampString), patient ? "H" : "");
-    EXPECT_EQ(taken >= std::chrono::milliseconds(300), patient);
+    EXPECT_EQ(result.status == 0, milliseconds == 60000);
+    EXPECT_EQ(reply.getString(vell::helper::kKeyTimestampString), milliseconds == 60000 ? "H" : "");
   }
 }

@@ -5,7 +5,6 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
-#include <array>
 #include <cerrno>
 #include <cstdint>
 #include <cstring>
@@ -23,8 +22,7 @@ class SystemLogSocket {
       : socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0)) {
     const auto path = root / "run/systemd/journal/socket";
     std::filesystem::create_directories(path.parent_path());
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
+    sockaddr_un address{AF_UNIX, ""};
     path.string().copy(address.sun_path, sizeof address.sun_path - 1);
     if (bind(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) {
       throw std::system_error(errno, std::generic_category(), path.string());
@@ -34,29 +32,23 @@ class SystemLogSocket {
   /// The MESSAGE of each entry at priority `err` that has come since the last call.
   std::vector<std::string> messages() {
     std::vector<std::string> found;
-    std::array<char, 262144> datagram{};
-    while (true) {
-      const auto size = recv(socket.get(), datagram.data(), datagram.size(), 0);
-      if (size < 0) {
-        return found;
-      }
-      const std::string entry(datagram.data(), static_cast<std::size_t>(size));
-      if (valueOf(entry, "PRIORITY") == "3") {
-        found.push_back(valueOf(entry, "MESSAGE"));
+    std::string entry(262144, '\0');
+    for (ssize_t size = 0; (size = recv(socket.get(), entry.data(), entry.size(), 0)) >= 0;) {
+      const auto whole = "\n" + entry.substr(0, static_cast<std::size_t>(size));
+      if (valueOf(whole, "\nPRIORITY\n") == "3") {
+        found.push_back(valueOf(whole, "\nMESSAGE\n"));
       }
     }
+    return found;
   }
 
  private:
   /// A field of an entry in the journal's native protocol, in its form with a length.
   static std::string valueOf(const std::string& entry, const std::string& field) {
-    const auto start = ("\n" + entry).find("\n" + field + "\n");
-    if (start == std::string::npos) {
-      return "";
-    }
+    const auto start = entry.find(field) + field.size();
     std::uint64_t size = 0;
-    std::memcpy(&size, entry.data() + start + field.size() + 1, sizeof size);
-    return entry.substr(start + field.size() + 1 + sizeof size, size);
+    std::memcpy(&size, entry.data() + start, sizeof size);
+    return entry.substr(start + sizeof size, size);
   }
 
   FileDescriptor socket;

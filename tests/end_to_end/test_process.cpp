@@ -2,172 +2,83 @@
 
 #include <fcntl.h>
 #include <poll.h>
-#include <pty.h>
-#include <sys/ioctl.h>
+#include <sys/mman.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <csignal>
-#include <cstdlib>
+#include <fstream>
+#include <sstream>
 #include <stdexcept>
 #include <system_error>
 #include <utility>
 
 namespace {
 
-constexpr int kPatienceMilliseconds = 60'000;
-constexpr int kStatusCannotRun = 127;
-constexpr const char* kEndOfFileKey = "\x04";
-
-/// Throws what errno says of `call` when `result` is negative.
-int checked(int result, const char* call) {
-  if (result < 0) {
-    throw std::system_error(errno, std::generic_category(), call);
+/// The end of a new pipe that a process is to have; `testsEnd` is the other one.
+FileDescriptor makePipe(FileDescriptor& testsEnd, bool processReads) {
+  int ends[2] = {-1, -1};
+  if (pipe2(ends, O_CLOEXEC) != 0) {
+    throw std::system_error(errno, std::generic_category(), "pipe2");
   }
-  return result;
+  testsEnd = FileDescriptor(ends[processReads ? 1 : 0]);
+  return FileDescriptor(ends[processReads ? 0 : 1]);
 }
 
-struct Pipe {
-  FileDescriptor readable;
-  FileDescriptor writable;
-
-  Pipe() {
-    int ends[2] = {-1, -1};
-    checked(pipe2(ends, O_CLOEXEC), "pipe2");
-    readable = FileDescriptor(ends[0]);
-    writable = FileDescriptor(ends[1]);
+pid_t startChild(std::vector<std::string> words, int input, int output, int errors) {
+  std::vector<char*> arguments(words.size() + 1);
+  std::transform(words.begin(), words.end(), arguments.begin(),
+                 [](std::string& word) { return word.data(); });
+  const pid_t child = fork();
+  if (child != 0) {
+    return child;
   }
-};
-
-/// The test's end and the process's end of one of its streams or of two.
-struct Streams {
-  FileDescriptor testsInput;
-  FileDescriptor testsOutput;
-  FileDescriptor processInput;
-  FileDescriptor processOutput;
-};
-
-Streams makePipes() {
-  Pipe in;
-  Pipe out;
-  return {std::move(in.writable), std::move(out.readable), std::move(in.readable),
-          std::move(out.writable)};
-}
-
-Streams makeTerminal() {
-  int master = -1;
-  int slave = -1;
-  checked(openpty(&master, &slave, nullptr, nullptr, nullptr), "openpty");
-  for (const int end : {master, slave}) {
-    checked(fcntl(end, F_SETFD, FD_CLOEXEC), "fcntl");
-  }
-  return {
-      FileDescriptor(checked(fcntl(master, F_DUPFD_CLOEXEC, 0), "fcntl")), FileDescriptor(master),
-      FileDescriptor(checked(fcntl(slave, F_DUPFD_CLOEXEC, 0), "fcntl")), FileDescriptor(slave)};
-}
-
-std::vector<char*> pointersTo(std::vector<std::string>& words) {
-  std::vector<char*> pointers;
-  pointers.reserve(words.size() + 1);
-  for (auto& word : words) {
-    pointers.push_back(word.data());
-  }
-  pointers.push_back(nullptr);
-  return pointers;
-}
-
-std::vector<std::string> environmentWith(const std::map<std::string, std::string>& additions) {
-  std::vector<std::string> environment;
-  for (char** variable = environ; *variable != nullptr; ++variable) {
-    const std::string text = *variable;
-    if (!additions.contains(text.substr(0, text.find('=')))) {
-      environment.push_back(text);
-    }
-  }
-  for (const auto& [name, value] : additions) {
-    environment.push_back(std::string(name).append("=").append(value));
-  }
-  return environment;
+  prctl(PR_SET_PDEATHSIG, SIGKILL);
+  std::signal(SIGPIPE, SIG_DFL);
+  dup2(input, STDIN_FILENO);
+  dup2(output, STDOUT_FILENO);
+  dup2(errors, STDERR_FILENO);
+  execv(arguments.front(), arguments.data());
+  _exit(EXIT_FAILURE);
 }
 
 }  // namespace
 
-TestProcess::TestProcess(const ProcessStart& start) : terminal(start.onTerminal) {
+TestProcess::TestProcess(const ProcessStart& start) : errors(memfd_create("errors", MFD_CLOEXEC)) {
   // A process that has ended must not end the test when the test writes to it.
   std::signal(SIGPIPE, SIG_IGN);
-  auto streams = terminal ? makeTerminal() : makePipes();
-  Pipe errorPipe;
-  auto words = start.words;
-  if (!start.name.empty()) {
-    words.front() = start.name;
+  std::vector<std::string> words = {"/usr/bin/env"};
+  for (const auto& [name, value] : start.environment) {
+    words.push_back(std::string(name).append("=").append(value));
   }
-  auto environment = environmentWith(start.environment);
-  const auto arguments = pointersTo(words);
-  const auto variables = pointersTo(environment);
-  process = checked(fork(), "fork");
-  if (process == 0) {
-    prctl(PR_SET_PDEATHSIG, SIGKILL);
-    std::signal(SIGPIPE, SIG_DFL);
-    dup2(streams.processInput.get(), STDIN_FILENO);
-    dup2(streams.processOutput.get(), STDOUT_FILENO);
-    dup2(errorPipe.writable.get(), STDERR_FILENO);
-    if (terminal) {
-      setsid();
-      ioctl(STDIN_FILENO, TIOCSCTTY, 0);
-    }
-    execve(start.words.front().c_str(), arguments.data(), variables.data());
-    _exit(kStatusCannotRun);
-  }
-  input = std::move(streams.testsInput);
-  output = std::move(streams.testsOutput);
-  errors = std::move(errorPipe.readable);
+  words.insert(words.end(), start.words.begin(), start.words.end());
+  const auto processInput = makePipe(input, true);
+  const auto processOutput = makePipe(output, false);
+  process = startChild(std::move(words), processInput.get(), processOutput.get(), errors.get());
+  killer = {nullptr, [started = process](void*) {
+              kill(started, SIGKILL);
+              waitpid(started, nullptr, 0);
+            }};
 }
 
-TestProcess::TestProcess(TestProcess&& other) noexcept
-    : terminal(other.terminal),
-      process(std::exchange(other.process, -1)),
-      input(std::move(other.input)),
-      output(std::move(other.output)),
-      errors(std::move(other.errors)),
-      unreadOutput(std::move(other.unreadOutput)),
-      allErrors(std::move(other.allErrors)) {}
-
-TestProcess::~TestProcess() {
-  if (process > 0) {
-    kill(process, SIGKILL);
-    waitpid(process, nullptr, 0);
+void TestProcess::write(const std::string& text) const {
+  ssize_t count = 0;
+  for (std::size_t at = 0; count >= 0 && at < text.size(); at += static_cast<std::size_t>(count)) {
+    count = ::write(input.get(), text.data() + at, text.size() - at);
   }
-}
-
-void TestProcess::write(const std::string& text) {
-  for (std::size_t written = 0; written < text.size();) {
-    const auto count = ::write(input.get(), text.data() + written, text.size() - written);
-    if (count < 0) {
-      return;
-    }
-    written += static_cast<std::size_t>(count);
-  }
-}
-
-void TestProcess::endInput() {
-  if (terminal) {
-    return write(kEndOfFileKey);
-  }
-  input = FileDescriptor();
 }
 
 std::string TestProcess::readUntil(const std::string& text) {
-  auto found = unreadOutput.find(text);
-  while (found == std::string::npos) {
-    if (!readSome(false)) {
+  while (unreadOutput.find(text) == std::string::npos) {
+    if (!readSome()) {
       giveUp(text);
     }
-    found = unreadOutput.find(text);
   }
-  auto taken = unreadOutput.substr(0, found + text.size());
+  auto taken = unreadOutput.substr(0, unreadOutput.find(text) + text.size());
   unreadOutput.erase(0, taken.size());
   return taken;
 }
@@ -183,49 +94,43 @@ void TestProcess::sendSignal(int signalNumber) const {
 }
 
 ProcessResult TestProcess::finish() {
-  endInput();
+  input = FileDescriptor();
   return await();
 }
 
 ProcessResult TestProcess::await() {
-  while (readSome(true)) {
+  while (readSome()) {
   }
-  int status = 0;
-  waitpid(std::exchange(process, -1), &status, 0);
+  // It is reaped later, so that until then its number is no other process's.
+  siginfo_t end{};
+  waitid(P_PID, static_cast<id_t>(process), &end, WEXITED | WNOWAIT);
   constexpr int kSignalled = 128;
-  return {WIFEXITED(status) ? WEXITSTATUS(status) : kSignalled + WTERMSIG(status),
-          std::exchange(unreadOutput, ""), std::exchange(allErrors, "")};
+  return {end.si_code == CLD_EXITED ? end.si_status : kSignalled + end.si_status,
+          std::exchange(unreadOutput, ""),
+          contentOf("/proc/self/fd/" + std::to_string(errors.get()))};
 }
 
-/// Takes in what can be read now, waiting for it. False at the end of standard output, or with
-/// `untilEnd` at the end of both.
-bool TestProcess::readSome(bool untilEnd) {
-  pollfd ends[] = {{output.get(), POLLIN, 0}, {errors.get(), POLLIN, 0}};
-  if (!output && (!untilEnd || !errors)) {
-    return false;
+/// Takes in what can be read now, waiting for it. False at the end.
+bool TestProcess::readSome() {
+  constexpr int kPatienceMilliseconds = 60'000;
+  pollfd readable{output.get(), POLLIN, 0};
+  if (poll(&readable, 1, kPatienceMilliseconds) == 0) {
+    giveUp("more output");
   }
-  if (checked(poll(ends, 2, kPatienceMilliseconds), "poll") == 0) {
-    giveUp(untilEnd ? "its end" : "more output");
-  }
-  const auto take = [](const pollfd& ready, FileDescriptor& end, std::string& text) {
-    std::array<char, 4096> buffer{};
-    if (ready.revents == 0) {
-      return;
-    }
-    // A terminal whose other end is closed gives an error where a pipe gives nothing.
-    const auto count = read(ready.fd, buffer.data(), buffer.size());
-    if (count <= 0) {
-      end = FileDescriptor();
-      return;
-    }
-    text.append(buffer.data(), static_cast<std::size_t>(count));
-  };
-  take(ends[0], output, unreadOutput);
-  take(ends[1], errors, allErrors);
-  return true;
+  std::array<char, 4096> buffer{};
+  const auto count = read(output.get(), buffer.data(), buffer.size());
+  unreadOutput.append(buffer.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+  return count > 0;
 }
 
-void TestProcess::giveUp(const std::string& awaited) {
+void TestProcess::giveUp(const std::string& awaited) const {
   throw std::runtime_error("no \"" + awaited + "\"; unread output \"" + unreadOutput +
-                           "\", errors \"" + allErrors + "\"");
+                           "\", errors \"" +
+                           contentOf("/proc/self/fd/" + std::to_string(errors.get())) + "\"");
+}
+
+std::string contentOf(const std::filesystem::path& path) {
+  std::ostringstream text;
+  text << std::ifstream(path, std::ios::binary).rdbuf();
+  return text.str();
 }

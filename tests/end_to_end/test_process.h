@@ -4,18 +4,17 @@
 
 #include <sys/types.h>
 
+#include <filesystem>
 #include <map>
-#include <optional>
+#include <memory>
 #include <ostream>
 #include <string>
 #include <vector>
 
-/// How to start a process: each member has the plain case as its default.
+/// How to start a process.
 struct ProcessStart {
-  std::vector<std::string> words;                  ///< The program's path and its arguments.
-  std::map<std::string, std::string> environment;  ///< On top of the test's own.
-  std::string name;                                ///< Its name for itself, if not its path.
-  bool onTerminal = false;                         ///< Standard input and output are a terminal.
+  std::vector<std::string> words;  ///< The program, looked up along PATH, and its arguments.
+  std::map<std::string, std::string> environment = {};  ///< On top of the test's own.
 };
 
 /// What a process that has ended left behind.
@@ -32,27 +31,16 @@ struct ProcessResult {
   }
 };
 
-/// A process whose standard streams the test holds: pipes, or a terminal and a pipe for standard
-/// error. Whatever the test waits for and does not get within a minute throws std::runtime_error
-/// that tells what the process had written. Used by one thread. Killed with the object, if it still
-/// runs, and also when the test program dies.
+/// A process whose standard input and output are pipes that the test holds. What the test waits for
+/// and does not get within a minute throws std::runtime_error that tells what the process had
+/// written. Used by one thread. Killed with the object, and also when the test program dies.
 class TestProcess {
  public:
   /// Starts it. A program that cannot be run is a process that ends with 127.
   explicit TestProcess(const ProcessStart& start);
-  TestProcess(TestProcess&& other) noexcept;
-  TestProcess& operator=(TestProcess&&) = delete;
-  TestProcess(const TestProcess&) = delete;
-  TestProcess& operator=(const TestProcess&) = delete;
-  ~TestProcess();
-
-  [[nodiscard]] pid_t id() const { return process; }
 
   /// Writes to its standard input; what it does not take, because it has ended, is dropped.
-  void write(const std::string& text);
-
-  /// Ends its standard input: closes the pipe, or types the end-of-file key.
-  void endInput();
+  void write(const std::string& text) const;
 
   /// Waits until it has written `text` to standard output behind what earlier calls took, and takes
   /// everything up to there.
@@ -63,21 +51,23 @@ class TestProcess {
 
   void sendSignal(int signalNumber) const;
 
-  /// Ends its input and waits for its end. The output is what no earlier call has taken.
+  /// Closes its input and waits for its end. The output is what no earlier call has taken.
   ProcessResult finish();
 
-  /// Waits for its end without ending its input.
+  /// Waits for its end without closing its input.
   ProcessResult await();
 
  private:
-  bool readSome(bool untilEnd);
-  [[noreturn]] void giveUp(const std::string& awaited);
+  bool readSome();
+  [[noreturn]] void giveUp(const std::string& awaited) const;
 
-  bool terminal;
-  pid_t process = -1;
   FileDescriptor input;
   FileDescriptor output;
-  FileDescriptor errors;
+  FileDescriptor errors;  ///< The file that is its standard error.
   std::string unreadOutput;
-  std::string allErrors;
+  pid_t process;
+  std::shared_ptr<void> killer;
 };
+
+/// A file's content; empty when there is none.
+std::string contentOf(const std::filesystem::path& path);
