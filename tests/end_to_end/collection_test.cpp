@@ -10,16 +10,17 @@ namespace {
 
 const std::string kFolder = "Path = /private/var/wireless/Library/Logs/Faultkeeper/Baseband/";
 
+/// A profile, words as the shell takes them, and what comes of it: the requests, what is printed,
+/// the status if it is not 0, and what lies there.
 struct Case {
   std::string profile;
-  std::string words;  ///< As the shell takes them.
-  std::string
-      expected;  ///< The requests, what is printed, the status if it is not 0, what lies there.
+  std::string words;
+  std::string expected;
 };
 
-/// That the collection of that name is printed and lies there.
+/// That the collection log-bb-`name` is printed and lies there.
 std::string path(const std::string& name) {
-  return kFolder + name + "\n" + name + "\n";
+  return kFolder + "log-bb-" + name + "\nlog-bb-" + name + "\n";
 }
 
 std::string query(const std::string& trace, const std::string& property) {
@@ -31,32 +32,14 @@ const std::string kMode = query("SystemLogs", "TraceMode");
 const std::string kEnabled = query("Baseband", "TraceEnabled");
 const std::string kHighThroughput = query("Baseband", "TraceHighThroughput");
 const std::string kHelper = "Perform 4 TidewellStatus {Timeout: x 1500}\n";
+const std::string kByUser = "User triggered";
 
-/// The request for a collection: `keys` up to the reason, and what comes behind it.
-std::string dump(const std::string& keys, const std::string& rest,
-                 const std::string& reason = "User triggered") {
+/// The request for a collection: the keys up to the reason, and those up to the compression.
+std::string dump(const std::string& keys, const std::string& reason, const std::string& mode,
+                 const std::string& moreKeys = "") {
   return "PerformCommand TraceDumpState {" + keys + ": s " +
-         simulator::quoted("[velltool] " + reason) + ", " + rest + "}\n";
-}
-
-std::string telephony(const std::string& mode, const std::string& reason = "User triggered") {
-  return kMode + dump("TraceAction: s \"CollectTelephonyLogs\", TraceDumpStateReason",
-                      "TraceDumpStatePerformCompression: x " + mode, reason);
-}
-
-std::string core(const std::string& mode, const std::string& reason = "User triggered") {
-  return dump(
-      "BasebandResetType: s \"Hard\", BasebandResetSubType: s \"OtherErrors\", "
-      "TraceAction: s \"CollectTelephonyLogsWithCoredump\", BasebandResetReason",
-      "TraceDumpStatePerformCompression: x " + mode, reason);
-}
-
-std::string baseband(const std::string& mode, const std::string& reason = "User triggered") {
-  return kMode + dump("TraceDumpStateReason",
-                      "TraceAction: s \"CollectBasebandLogs\", "
-                      "TraceDumpStatePerformCompression: x " +
-                          mode,
-                      reason);
+         simulator::quoted("[velltool] " + reason) + ", " + moreKeys +
+         "TraceDumpStatePerformCompression: x " + mode + "}\n";
 }
 
 void expectRuns(const std::string& command, const std::string& profile,
@@ -67,19 +50,29 @@ void expectRuns(const std::string& command, const std::string& profile,
     const SimulatedDevice device("RADIO_TYPE=1\nTIMESTAMP=T\n" + profile + ownProfile);
     const auto [status, output, errors] = device.runTool("logdump " + command + " " + words);
     EXPECT_EQ(errors, "");
-    auto requests = device.requests();
-    if (const std::string greeting = "OpenClient \"velltool\"\n"; requests.starts_with(greeting)) {
-      requests.erase(0, greeting.size());
-    }
-    EXPECT_EQ(requests + output + (status == 0 ? "" : "status " + std::to_string(status) + "\n") +
+    EXPECT_EQ(device.requests() + output +
+                  (status == 0 ? "" : "status " + std::to_string(status) + "\n") +
                   device.collections(),
               expected);
   }
 }
 
-}  // namespace
-
 // clang-format off
+
+std::string telephony(const std::string& mode, const std::string& reason = kByUser) {
+  return kMode + dump("TraceAction: s \"CollectTelephonyLogs\", TraceDumpStateReason", reason, mode);
+}
+
+std::string core(const std::string& mode, const std::string& reason = kByUser) {
+  return dump("BasebandResetType: s \"Hard\", BasebandResetSubType: s \"OtherErrors\", "
+              "TraceAction: s \"CollectTelephonyLogsWithCoredump\", BasebandResetReason", reason, mode);
+}
+
+std::string baseband(const std::string& mode, const std::string& reason = kByUser) {
+  return kMode + dump("TraceDumpStateReason", reason, mode, "TraceAction: s \"CollectBasebandLogs\", ");
+}
+
+}  // namespace
 
 TEST(Collection, OfTelephonyLogs) {
   const std::string success = "Telephony log collection: Success\n";
@@ -89,12 +82,12 @@ TEST(Collection, OfTelephonyLogs) {
   const std::string longWord(100000, 'x');
   expectRuns("tel", "", {
       {"", "", telephony("0") + open},
-      {"", "Tar.Gz nonui my tar", telephony("1" + quiet, "my") + success + path("log-bb-T.tar.gz")},
+      {"", "Tar.Gz nonui my tar", telephony("1" + quiet, "my") + success + path("T.tar.gz")},
       {"SystemLogs.TraceMode=3", "tar", telephony("0") + open},
       {"SystemLogs.TraceMode=3\nSystemLogs.TraceMode_TYPE=integer", "tar",
-       telephony("2") + success + path("log-bb-T.tar")},
+       telephony("2") + success + path("T.tar")},
       {"SystemLogs.TraceMode_TYPE=other\nTIMESTAMP_TYPE=other", "tar",
-       telephony("2") + success + path("log-bb-.tar")},
+       telephony("2") + success + path(".tar")},
       {"DEFAULT_COMPRESSION=7\nCOMPRESSION_SUPPORTED=no", "", telephony("7") + open},
       {"GET_TRACE_PROPERTY=wrong-signature", "", telephony("0") + open},
       {"TRACE_DUMP_STATE=no-dictionary", "",
@@ -113,10 +106,10 @@ TEST(Collection, OfTelephonyLogsWithACoreDump) {
   const std::string title = "Telephony log collection with Coredump: ";
   const std::string success = title + "Success\n";
   expectRuns("core", "DEFAULT_COMPRESSION=tar.gz\nSystemLogs.TraceMode=3\n", {
-      {"", "'' tar", core("1", "") + success + path("log-bb-T.tar.gz")},
-      {"", "nocompress", core("0") + success + path("log-bb-T-cd") + "log-bb-T-telephony\n"},
+      {"", "'' tar", core("1", "") + success + path("T.tar.gz")},
+      {"", "nocompress", core("0") + success + path("T-cd") + "log-bb-T-telephony\n"},
       {"RADIO_VENDOR=2\nDEFAULT_COMPRESSION=nocompress", "NONUI",
-       core("0, TraceUserConfirmation: b false") + success + path("log-bb-T-coredump") +
+       core("0, TraceUserConfirmation: b false") + success + path("T-coredump") +
        "log-bb-T-telephony\n"},
       {"TRACE_DUMP_STATE=status:-2147483648", "", core("1") + title + "Failed\n"},
   });
@@ -128,23 +121,22 @@ TEST(Collection, OfBasebandLogsFromARunningManager) {
   const std::string off = "Baseband logs are not enabled\n";
   const std::string both = kEnabled + kHighThroughput;
   const std::string all = both + baseband("0");
-  const std::string diag = success + path("log-bb-T-diag");
+  const std::string diag = success + path("T-diag");
   expectRuns("bb", "RADIO_DIAG_QDSS=yes\nBaseband.TraceEnabled=yes\nBaseband.TraceHighThroughput=no\n", {
       // The state of the server does not matter to this command.
       {"SERVER_STATE=Starting", "", all + diag},
       {"Baseband.TraceHighThroughput=LITE", "nonui why tar",
-       both + baseband("0", "why") + success + path("log-bb-T-qdss")},
-      {"RADIO_VENDOR=2\nBaseband.TraceHighThroughput=1", "", all + success + path("log-bb-T-bb-trace")},
+       both + baseband("0", "why") + success + path("T-qdss")},
+      {"RADIO_VENDOR=2\nBaseband.TraceHighThroughput=1", "", all + success + path("T-bb-trace")},
       {"RADIO_VENDOR=3\nRADIO_DIAG_QDSS=no\nBaseband.TraceHighThroughput=yes", "",
        kEnabled + baseband("0") + diag},
       {"GET_TRACE_PROPERTY.Baseband.TraceHighThroughput=status:7", "tar.gz",
-       both + baseband("1") + success + path("log-bb-T.tar.gz")},
+       both + baseband("1") + success + path("T.tar.gz")},
       {"Baseband.TraceHighThroughput_TYPE=no-dictionary\nSystemLogs.TraceMode=3", "tar.gz", all + diag},
       {"COMPRESSION_SUPPORTED=no\nDEFAULT_COMPRESSION=tar\nTIMESTAMP=", "",
-       all + success + path("log-bb--diag")},
-      {"TIMESTAMP_TYPE=missing", "TAR", both + baseband("2") + success + path("log-bb-.tar")},
-      {"TIMESTAMP_TYPE=integer\nBaseband.TraceEnabled=' 0x10'", "",
-       all + success + path("log-bb--diag")},
+       all + success + path("-diag")},
+      {"TIMESTAMP_TYPE=missing", "TAR", both + baseband("2") + success + path(".tar")},
+      {"TIMESTAMP_TYPE=integer\nBaseband.TraceEnabled=' 0x10'", "", all + success + path("-diag")},
       {"TRACE_DUMP_STATE=no-dictionary", "",
        all + success + kFolder + "log-bb--diag\nlog-bb-T-diag\n"},
       {"TRACE_DUMP_STATE=status:1", "", all + failure},
@@ -164,15 +156,15 @@ TEST(Collection, OfBasebandLogsThatAManagerLeftBehind) {
   const std::string success = "Baseband log collection: Success (Vell not running)\n";
   const std::string live = success + "Path = /private/var/wireless/Library/Logs/VellManager/";
   const std::string scratch = live + "DIAG.scratch\n";
-  const std::string snapshot = kHelper + success + path("log-bb-H-diag");
+  const std::string snapshot = kHelper + success + path("H-diag");
   const std::string both = kEnabled + kHighThroughput;
   expectRuns("bb",
       "MANAGER=absent\nINTERNAL_BUILD=yes\nRADIO_DIAG_QDSS=yes\nHELPER_TIMESTAMP=H\n"
       "Baseband.TraceEnabled=yes\nBaseband.TraceHighThroughput=no\n", {
       {"", "tar", snapshot},
       {"INTERNAL_BUILD=no\nCARRIER_BUILD=yes\nBaseband.TraceHighThroughput=on", "",
-       kHelper + success + path("log-bb-H-qdss")},
-      {"RADIO_VENDOR=2", "", kHelper + success + path("log-bb-H-bb-trace")},
+       kHelper + success + path("H-qdss")},
+      {"RADIO_VENDOR=2", "", kHelper + success + path("H-bb-trace")},
       {"INTERNAL_BUILD=no", "", scratch},
       {"INTERNAL_BUILD=no\nRADIO_VENDOR=2\nBaseband.TraceHighThroughput=yes", "",
        live + "QDSS.scratch\n"},

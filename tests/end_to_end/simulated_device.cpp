@@ -4,19 +4,16 @@
 
 #include <gtest/gtest.h>
 
-TestProcess startSimulator(const std::vector<std::string>& words, const std::string& profile) {
-  constexpr const char* kLine = "profile=$1; shift; exec \"$0\" \"$@\" 3<<END\n$profile\nEND";
-  std::vector<std::string> all = {"sh", "-c", kLine, VELL_SIMULATOR_PATH, profile};
-  all.insert(all.end(), words.begin(), words.end());
-  return TestProcess({all});
+TestProcess startSimulator(const std::string& words, const std::string& profile) {
+  const auto line = "exec \"$0\" " + words + " 3<<END\n$1\nEND";
+  return TestProcess({{"sh", "-c", line, VELL_SIMULATOR_PATH, profile}});
 }
 
 SimulatedDevice::SimulatedDevice(const std::string& profile)
     // It tells where the device is, and holds it until the test ends its input.
-    : process(
-          startSimulator({"/dev/fd/3", "--", "sh", "-c",
-                          R"(printf '%s\n' "$VELL_SYSROOT" "$DBUS_SYSTEM_BUS_ADDRESS"; exec cat)"},
-                         "JOURNAL=no\n" + profile)),
+    : process(startSimulator(
+          R"(/dev/fd/3 -- sh -c 'echo "$VELL_SYSROOT"; echo "$DBUS_SYSTEM_BUS_ADDRESS"; exec cat')",
+          "JOURNAL=no\n" + profile)),
       rootPath(process.readLine()),
       address(process.readLine()) {}
 
@@ -45,8 +42,8 @@ TestProcess SimulatedDevice::serve(const std::string& service) const {
 }
 
 std::string SimulatedDevice::requests() const {
-  const auto logs = rootPath / "var/log/vell-simulator";
-  return contentOf(logs / "manager.log") + contentOf(logs / "helper.log");
+  return runLine("cd $VELL_SYSROOT/var/log/vell-simulator; cat manager.log helper.log | grep ^Perf")
+      .output;
 }
 
 std::string SimulatedDevice::collections() const {

@@ -41,8 +41,8 @@ class SimulatedDevice {
   /// the manager's input change its state. Throws when it does not start.
   [[nodiscard]] TestProcess serve(const std::string& service) const;
 
-  /// The lines of the requests that the manager of the device and then those that its helper has
-  /// received so far, unless `serve` has started them.
+  /// The lines of the requests that the manager of the device has carried out so far, and of those
+  /// that its helper has, unless `serve` has started them.
   [[nodiscard]] std::string requests() const;
 
   /// What lies in the device's folder of collected logs: a line each, sorted.
@@ -54,5 +54,5 @@ class SimulatedDevice {
   std::string address;
 };
 
-/// Starts vell-simulator with `words`, in which /dev/fd/3 is a file that holds `profile`.
-TestProcess startSimulator(const std::vector<std::string>& words, const std::string& profile = "");
+/// Starts vell-simulator with `words`, which the shell splits; /dev/fd/3 holds `profile`.
+TestProcess startSimulator(const std::string& words, const std::string& profile);

@@ -34,7 +34,10 @@ pid_t startChild(std::vector<std::string> words, int input, int output, int erro
   std::transform(words.begin(), words.end(), arguments.begin(),
                  [](std::string& word) { return word.data(); });
   const pid_t child = fork();
-  if (child != 0) {
+  if (child < 0) {
+    throw std::system_error(errno, std::generic_category(), "fork");
+  }
+  if (child > 0) {
     return child;
   }
   prctl(PR_SET_PDEATHSIG, SIGKILL);
@@ -106,8 +109,7 @@ ProcessResult TestProcess::await() {
   waitid(P_PID, static_cast<id_t>(process), &end, WEXITED | WNOWAIT);
   constexpr int kSignalled = 128;
   return {end.si_code == CLD_EXITED ? end.si_status : kSignalled + end.si_status,
-          std::exchange(unreadOutput, ""),
-          contentOf("/proc/self/fd/" + std::to_string(errors.get()))};
+          std::exchange(unreadOutput, ""), writtenErrors()};
 }
 
 /// Takes in what can be read now, waiting for it. False at the end.
@@ -125,8 +127,11 @@ bool TestProcess::readSome() {
 
 void TestProcess::giveUp(const std::string& awaited) const {
   throw std::runtime_error("no \"" + awaited + "\"; unread output \"" + unreadOutput +
-                           "\", errors \"" +
-                           contentOf("/proc/self/fd/" + std::to_string(errors.get())) + "\"");
+                           "\", errors \"" + writtenErrors() + "\"");
+}
+
+std::string TestProcess::writtenErrors() const {
+  return contentOf("/proc/self/fd/" + std::to_string(errors.get()));
 }
 
 std::string contentOf(const std::filesystem::path& path) {

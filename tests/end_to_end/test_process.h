@@ -60,6 +60,7 @@ class TestProcess {
  private:
   bool readSome();
   [[noreturn]] void giveUp(const std::string& awaited) const;
+  [[nodiscard]] std::string writtenErrors() const;
 
   FileDescriptor input;
   FileDescriptor output;

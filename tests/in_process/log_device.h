@@ -26,11 +26,11 @@ struct LogDevice {
   std::list<LogEntry> entries;                 ///< What it delivers, unfiltered, when activated.
   std::optional<unsigned long> endReason = 5;  ///< Without one it does not end.
   unsigned flags = 0;                          ///< As the export set them.
-  LogFilter filter;                            ///< As the export set it.
+  std::optional<LogFilter> filter;             ///< As the export set it.
   std::optional<LogTime> from;                 ///< As the export activated it.
   bool invalidated = false;                    ///< By the export.
   LogReader::EntryHandler entryHandler;        ///< For entries that come late.
-  LogReader::InvalidationHandler invalidationHandler;
+  LogReader::InvalidationHandler endHandler;
 
   std::map<std::string, std::string> files;  ///< Content by path.
   bool filesCanBeOpened = true;

@@ -1,11 +1,9 @@
 #include "logdump/logdump_command.h"
 
 #include "logdump/os_log_context.h"
-#include "platform/manager_names.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"
 #include "tests/unit/console.h"
-#include "tool/server_state.h"
 #include "tool/vell_shell.h"
 
 #include <gtest/gtest.h>
@@ -31,24 +29,6 @@ TEST(LogdumpCommand, IsFoundBelowARootOfTheProgramsName) {
                                       "RegisterEventHandler ServerStateChange", "EventsOff",
                                       "EventsOn"}));
   EXPECT_EQ(in_process::logDevice.longestWait, std::chrono::milliseconds(500));
-}
-
-TEST(ServerState, FollowsTheLatestEvent) {
-  const std::pair<const char*, MessageDict::Value> others[] = {{"ServerState", "started"},
-                                                               {"ServerState", "Started "},
-                                                               {"ServerState", "Stopped"},
-                                                               {"ServerState", std::int64_t{1}},
-                                                               {"serverState", "Started"}};
-  for (const auto& [key, value] : others) {
-    MessageDict payload;
-    payload.set("ServerState", "Started");
-    followServerState(payload);
-    EXPECT_TRUE(IsServerRunning());
-    payload = MessageDict();
-    payload.set(key, value);
-    followServerState(payload);
-    EXPECT_FALSE(IsServerRunning());
-  }
 }
 
 TEST(OsLogContext, IsMadeOnce) {

@@ -13,10 +13,12 @@ namespace {
 
 using in_process::logDevice;
 
-/// Runs the handler on a new device and leaves its group.
-bool exportWith(std::list<std::string> words, const WorkGroup& group = WorkGroup::create()) {
+/// What the handler gives on a new device when it has left its group.
+bool exportWith(const std::list<std::string>& words, bool hasLog = true) {
   logDevice = {};
-  const bool result = makeOsLogHandler()(group, std::move(words));
+  logDevice.source = hasLog ? logDevice.source : nullptr;
+  const auto group = WorkGroup::create();
+  const bool result = makeOsLogHandler()(group, words);
   group.wait();
   return result;
 }
@@ -40,7 +42,7 @@ TEST(OsLogHandler, SortsItsWordsIntoTheSelection) {
     const Console console;
     EXPECT_TRUE(exportWith(words));
     std::string selected;
-    for (const auto& [kind, text] : logDevice.filter) {
+    for (const auto& [kind, text] : logDevice.filter.value_or(LogFilter())) {
       selected += (kind == LogComparison::Kind::ProcessEquals ? "p " : "i ") + text + ", ";
     }
     EXPECT_EQ(selected, selection);
@@ -50,15 +52,11 @@ TEST(OsLogHandler, SortsItsWordsIntoTheSelection) {
 }
 
 TEST(OsLogHandler, ReadsTheHistoryAsFarAsItIsANumber) {
-  const std::pair<const char*, int> cases[] = {{"60", 60},
-                                               {" \t+12abc", 12},
-                                               {"abc", 0},
-                                               {"", 0},
-                                               {"0x10", 0},
-                                               {"-60", -60},
-                                               {"3600.9", 3600},
-                                               {"99999999999", 2147483647},
-                                               {"-99999999999", -2147483648}};
+  // clang-format off
+  const std::pair<const char*, int> cases[] = {
+      {"60", 60}, {" \t+12abc", 12}, {"abc", 0}, {"", 0}, {"0x10", 0}, {"-60", -60}, {"3600.9", 3600},
+      {"99999999999", 2147483647}, {"-99999999999", -2147483648}};
+  // clang-format on
   for (const auto& [word, seconds] : cases) {
     SCOPED_TRACE(word);
     EXPECT_TRUE(exportWith({word, "out.txt", "-p"}));
@@ -69,12 +67,13 @@ TEST(OsLogHandler, ReadsTheHistoryAsFarAsItIsANumber) {
   }
 }
 
-TEST(OsLogHandler, NeedsAHistoryAndAPath) {
+TEST(OsLogHandler, NeedsAHistoryAPathAndALog) {
   const Console console;
   EXPECT_FALSE(exportWith({}));
   EXPECT_FALSE(exportWith({"60"}));
   EXPECT_EQ(console.output(), "os log collection: Failed\nos log collection: Failed\n");
   EXPECT_TRUE(logDevice.files.empty() && logDevice.messages.empty());
+  EXPECT_FALSE(exportWith({"60", "out.txt"}, false));
 }
 
 }  // namespace

@@ -21,15 +21,11 @@ const std::string kLine =
 const std::string kOddMessage("50 %d%s\n\0\tnaïve", 16);
 
 /// A zone with one offset.
-class FixedZone : public TimeZone {
- public:
+struct FixedZone : TimeZone {
   explicit FixedZone(hours ahead) : offset(ahead) {}
-  [[nodiscard]] std::chrono::seconds offsetAt(std::chrono::sys_seconds) const override {
-    return offset;
-  }
+  std::chrono::seconds offsetAt(std::chrono::sys_seconds) const override { return offset; }
 
- private:
-  hours offset;
+  const hours offset;
 };
 
 const FixedZone kGmt{hours(0)};
@@ -40,40 +36,33 @@ bool exportAll() {
   return OsLogStream::putOsLogStreamToFile(kPath, {}, {}, 3600);
 }
 
+// clang-format off
+
 /// An entry of the message "one" with everything in it, logged at 13:07:21 GMT.
 LogEntry fullEntry() {
-  return {kLogEntryMessage,
-          LogTime(std::chrono::microseconds(1'620'133'641'999'999)),
-          &kGmt,
-          0x1a2b,
-          0,
-          42,
-          "Linkward",
-          "libradio.so",
-          "/usr/lib/libradio.so",
-          "org.vell.link",
-          "calls",
-          "one"};
+  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kGmt, 0x1a2b, 0,
+          42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link", "calls", "one"};
 }
 
 TEST(OsLogStream, WritesOneLineForEachMessage) {
   const std::string rest = kLine.substr(19);
-  // clang-format off
-  const std::pair<std::function<void(LogEntry&)>, std::string> cases[] = {
+  using Change = std::function<void(LogEntry&)>;
+  const auto texts = [](std::optional<std::string_view> text) -> Change {
+    return [=](LogEntry& e) { e.process = e.sender = e.subsystem = e.category = e.composedMessage = text; };
+  };
+  const std::pair<Change, std::string> cases[] = {
       {[](LogEntry&) {}, kLine},
       {[](LogEntry& e) { e.timeZone = &kEast; }, "2021-05-04 15:07:21" + rest},
       {[](LogEntry& e) { e.timeZone = &kWest; }, "2021-05-03 23:07:21" + rest},
       {[](LogEntry& e) { e.time = LogTime(std::chrono::microseconds(-1)); }, "1969-12-31 23:59:59" + rest},
-      {[](LogEntry& e) { e.processIdentifier = -7, e.threadIdentifier = e.activityIdentifier = ~std::uint64_t{0}; },
+      {[](LogEntry& e) { e.processIdentifier = -7, e.threadIdentifier = e.activityIdentifier = ~0UL; },
        "2021-05-04 13:07:21 +0000 0xffffffffffffffff 0xffffffffffffffff -7 " + kLine.substr(41)},
-      {[](LogEntry& e) { e.process = e.sender = e.subsystem = e.category = e.composedMessage = std::nullopt, e.threadIdentifier = 0; },
-       "2021-05-04 13:07:21 +0000 0x00000 0x0 42 (null)((null)):(null) [(null)] (null)\n"},
-      {[](LogEntry& e) { e.process = e.sender = e.subsystem = e.category = e.composedMessage = ""; },
-       kLine.substr(0, 41) + "(): [] \n"},
+      {[](LogEntry& e) { e.threadIdentifier = 0; }, kLine.substr(0, 26) + "0x00000" + kLine.substr(33)},
+      {texts(std::nullopt), kLine.substr(0, 41) + "(null)((null)):(null) [(null)] (null)\n"},
+      {texts(""), kLine.substr(0, 41) + "(): [] \n"},
       {[](LogEntry& e) { e.composedMessage = kOddMessage; }, kLine.substr(0, 85) + kOddMessage + "\n"},
       {[](LogEntry& e) { e.type = 0; }, ""},
   };
-  // clang-format on
   logDevice = {};
   std::string lines;
   for (const auto& [change, line] : cases) {
@@ -83,7 +72,7 @@ TEST(OsLogStream, WritesOneLineForEachMessage) {
   EXPECT_TRUE(exportAll());
   EXPECT_EQ(logDevice.files[kPath], lines);
   EXPECT_EQ(logDevice.messages, std::vector{kStarted});
-  EXPECT_TRUE(logDevice.filter.empty());
+  EXPECT_EQ(logDevice.filter, std::nullopt);
 }
 
 TEST(OsLogStream, SetsUpTheReader) {
@@ -110,7 +99,6 @@ TEST(OsLogStream, TellsTheSystemLogWhatFailed) {
     std::vector<std::string> messages;
     std::string content;
   } cases[] = {
-      // clang-format off
       {[](LogDevice& d) { d.source = nullptr, d.storeError = {"No such file or directory"}; }, false,
        {"Could not open: No such file or directory", "Failed to prepare oslog stream"}, noFile},
       {[](LogDevice& d) { d.source = nullptr; }, false, {"Failed to prepare oslog stream"}, noFile},
@@ -122,7 +110,6 @@ TEST(OsLogStream, TellsTheSystemLogWhatFailed) {
        {kStarted, "Timeout on getting oslog stream"}, kLine + kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 1; }, false, {kStarted, full}, kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 0, d.endReason.reset(); }, false, {kStarted, full}, ""},
-      // clang-format on
   };
   for (const auto& [prepare, result, messages, content] : cases) {
     SCOPED_TRACE(testing::PrintToString(messages));
@@ -135,11 +122,13 @@ TEST(OsLogStream, TellsTheSystemLogWhatFailed) {
     logDevice.appendsUntilFull = 1;
     if (logDevice.entryHandler) {
       logDevice.entryHandler(fullEntry());
-      logDevice.invalidationHandler(kLogReaderAtEnd, logDevice.now);
+      logDevice.endHandler(kLogReaderAtEnd, logDevice.now);
     }
     EXPECT_EQ(logDevice.messages, messages);
     EXPECT_EQ(logDevice.files.contains(kPath) ? logDevice.files[kPath] : noFile, content);
   }
 }
+
+// clang-format on
 
 }  // namespace
