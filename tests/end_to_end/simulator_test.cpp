@@ -37,36 +37,30 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
   const std::string usage =
       "; usage: vell-simulator [PROFILE] [-- COMMAND...] | --serve bus|manager|helper|journal "
       "[LOGFILE]\n";
-  const struct {
-    std::string words;
-    std::string profile;
-    ProcessResult expected;
-  } cases[] = {
-      {"-- sh -c 'echo out; echo err >&2; exit 7'", "", {7, "out\n", "err\n"}},
-      {"-- sh -c 'kill -KILL $$'", "", {128 + SIGKILL, "", ""}},
-      {"-- /no/program", "", {127, "", me + "/no/program: No such file or directory\n"}},
-      {"a b", "", {2, "", me + "more than one profile" + usage}},
-      {"--help", "", {2, "", me + "\"--help\" is no profile" + usage}},
-      {"--", "", {2, "", me + "no command after --" + usage}},
-      {"--serve x", "", {2, "", me + "no service is called \"x\"" + usage}},
-      {"--serve", "", {2, "", me + "--serve takes a service and perhaps a file" + usage}},
-      {"--serve manager", "", {1, "", me + "--serve works inside a simulated device only\n"}},
-      {"/no/file -- true", "", {1, "", me + "/no/file: No such file or directory\n"}},
-      {"/dev/fd/3 -- true", "JOURNAL=no\nTRACE_DUMP_STAT=die\nSERVER_STATE_TYPE=string\nAny.Property=1",
-       {0, "", at + "2: TRACE_DUMP_STAT: not a key of the simulator's; it changes nothing\n"}},
-      {"/dev/fd/3 -- true",
-       "not a line\nBUS=maybe\nTIMESTAMP=a/b\nTIMESTAMP_TYPE=text\nHELPER_ANSWER=slow:-1",
-       {1, "", at + "1: not a KEY=value line\n" +
-        at + "2: BUS: \"maybe\" is not yes or no\n" +
-        at + "4: TIMESTAMP_TYPE: \"text\" is not string, integer, boolean, other, "
-        "missing or no-dictionary\n" +
-        at + "3: TIMESTAMP: \"a/b\" is not a part of a file name\n" +
-        at + "5: HELPER_ANSWER: \"slow:-1\" is not made of answer, no-dictionary, wrong-signature, "
-        "silent, die, restart, status:NUMBER and slow:MILLISECONDS\n"}},
+  const auto expect = [](const auto* words, const auto* profile, const ProcessResult& result) {
+    EXPECT_EQ(startSimulator(words, profile).finish(), result);
   };
-  for (const auto& [words, profile, expected] : cases) {
-    EXPECT_EQ(startSimulator(words, profile).finish(), expected);
-  }
+  expect("-- sh -c 'echo out; echo err >&2; exit 7'", "", {7, "out\n", "err\n"});
+  expect("-- sh -c 'kill -KILL $$'", "", {128 + SIGKILL, "", ""});
+  expect("-- /no/program", "", {127, "", me + "/no/program: No such file or directory\n"});
+  expect("a b", "", {2, "", me + "more than one profile" + usage});
+  expect("--help", "", {2, "", me + "\"--help\" is no profile" + usage});
+  expect("--", "", {2, "", me + "no command after --" + usage});
+  expect("--serve x", "", {2, "", me + "no service is called \"x\"" + usage});
+  expect("--serve", "", {2, "", me + "--serve takes a service and perhaps a file" + usage});
+  expect("--serve manager", "", {1, "", me + "--serve works inside a simulated device only\n"});
+  expect("/no/file -- true", "", {1, "", me + "/no/file: No such file or directory\n"});
+  expect("/dev/fd/3 -- true", "JOURNAL=no\nTRACE_DUMP_STAT=die\nSERVER_STATE_TYPE=string\nAny.Property=1",
+         {0, "", at + "2: TRACE_DUMP_STAT: not a key of the simulator's; it changes nothing\n"});
+  expect("/dev/fd/3 -- true",
+         "not a line\nBUS=maybe\nTIMESTAMP=a/b\nTIMESTAMP_TYPE=text\nHELPER_ANSWER=slow:-1",
+         {1, "", at + "1: not a KEY=value line\n" +
+          at + "2: BUS: \"maybe\" is not yes or no\n" +
+          at + "4: TIMESTAMP_TYPE: \"text\" is not string, integer, boolean, other, "
+          "missing or no-dictionary\n" +
+          at + "3: TIMESTAMP: \"a/b\" is not a part of a file name\n" +
+          at + "5: HELPER_ANSWER: \"slow:-1\" is not made of answer, no-dictionary, wrong-signature, "
+          "silent, die, restart, status:NUMBER and slow:MILLISECONDS\n"});
 }
 
 // clang-format on

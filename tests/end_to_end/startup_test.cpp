@@ -2,6 +2,7 @@
 
 #include "tests/end_to_end/simulated_device.h"
 #include "tests/end_to_end/system_log_socket.h"
+#include "tests/help_text.h"
 
 #include <gtest/gtest.h>
 
@@ -12,10 +13,7 @@ namespace {
 const std::string kPrompt = "(/velltool)>> ";
 
 std::string rootHelp(const std::string& name) {
-  return "\nOptions for command '\x1b[32m" + name + "\x1b[39m':\n\n" +
-         "\t         logdump  -  [bb|core|oslog|tel]\n\n"
-         "\t              cd  -  <sub-command>\n"
-         "\t            help\n\t            back\n\t            quit\n\n";
+  return helpText(name, "\t         logdump  -  [bb|core|oslog|tel]\n\n");
 }
 
 const ProcessResult kNoRadio = {255, "'velltool' is not supported on this product.\n", ""};

@@ -1,5 +1,6 @@
 #include "framework/command_shell.h"
 
+#include "tests/help_text.h"
 #include "tests/unit/console.h"
 #include "tests/unit/plain_node.h"
 
@@ -26,20 +27,27 @@ class TestShell : public CommandShell {
 
 /// The help that a node of the tree shows.
 std::string helpOf(const std::string& name) {
-  return "\nOptions for command '\x1b[32m" + name + "\x1b[39m':\n\n" +
-         "\t          locked  -  ...\n\n"
-         "\t              no  -  ...\n\n"
-         "\t              ok  -  ...\n\n" +
-         (name != "t" ? ""
-                      : "\t            deep  -  [locked|no|ok]\n\n"
-                        "\t          locked  -  [locked|no|ok]\n\n"
-                        "\t              no  -  [locked|no|ok]\n\n") +
-         "\t              cd  -  <sub-command>\n"
-         "\t            help\n\t            back\n\t            quit\n\n";
+  return helpText(name,
+                  "\t          locked  -  ...\n\n\t              no  -  ...\n\n"
+                  "\t              ok  -  ...\n\n" +
+                      std::string(name != "t" ? ""
+                                              : "\t            deep  -  [locked|no|ok]\n\n"
+                                                "\t          locked  -  [locked|no|ok]\n\n"
+                                                "\t              no  -  [locked|no|ok]\n\n"));
 }
 
 std::string invalid(const std::string& word, const std::string& node) {
   return "\nInvalid command option '\x1b[31m" + word + "\x1b[39m'" + helpOf(node);
+}
+
+void expectRun(std::list<std::string> words, const std::string& input, const std::string& output,
+               bool result) {
+  SCOPED_TRACE(testing::PrintToString(words) + input);
+  words.push_front("t");
+  const Console console(input);
+  EXPECT_EQ(TestShell().run(words), result);
+  EXPECT_EQ(console.output(), output);
+  EXPECT_EQ(console.errors(), "");
 }
 
 }  // namespace
@@ -47,70 +55,45 @@ std::string invalid(const std::string& word, const std::string& node) {
 // clang-format off
 
 TEST(CommandShell, RunsTheWordsOfACommandLine) {
-  const struct {
-    std::list<std::string> words;
-    std::string output;
-    bool result;
-  } cases[] = {
-      {{"--"}, "", true},
-      {{"no"}, "no\n", false},
-      {{"deep", "ok", "a", "", "cd", "help"}, "ok,a,,cd,help\n", true},
-      {{"--", "ok", "1", "--", "--", "deep", "no", "---", "--", "ok", "3"}, "ok,1\nno,---\n", false},
-      {{"help", "--", "ok", "--"}, helpOf("t") + "ok\n", true},
-      {{"deep", "help"}, helpOf("deep"), true},
-      {{"help", "deep"}, invalid("help", "t"), false},
-      {{"deep"}, helpOf("deep"), false},
-      {{""}, invalid("", "t"), false},
-      {{"deep", "nosuch", "ok"}, invalid("nosuch", "deep"), false},
-      {{"deep", "quit"}, invalid("quit", "deep"), false},
-      {{"quit", "now"}, invalid("quit", "t"), false},
-      {{"quit", "--", "ok"}, "", true},
-      {{"ok", "--", "exit", "--", "no"}, "ok\n", true},
-      {{"back", "--", "ok"}, "ok\n", true},
-      {{"locked", "ok"}, "", false},
-      {{"deep", "locked", "--", "ok"}, "", false},
-      {{"cd"}, helpOf("t"), false},
-      {{"cd", "deep", "ok"}, helpOf("t"), false},
-      {{"deep", "cd", "nosuch"}, helpOf("deep"), false},
-      {{"cd", "deep", "--", "nosuch"}, invalid("nosuch", "t"), false},
-      {{"cd", "deep/nosuch"}, helpOf("deep"), false},
-      {{"cd", "//deep//../locked/.././.."}, helpOf("t"), false},
-      {{"cd", "..//deep/../../locked/", "--", "cd", "///", "--", "ok"}, "ok\n", true},
-  };
-  for (auto [words, output, result] : cases) {
-    SCOPED_TRACE(testing::PrintToString(words));
-    words.push_front("t");
-    const Console console;
-    EXPECT_EQ(TestShell().run(words), result);
-    EXPECT_EQ(console.output(), output);
-    EXPECT_EQ(console.errors(), "");
-  }
+  expectRun({"--"}, "", "", true);
+  expectRun({"no"}, "", "no\n", false);
+  expectRun({"deep", "ok", "a", "", "cd", "help"}, "", "ok,a,,cd,help\n", true);
+  expectRun({"--", "ok", "1", "--", "--", "deep", "no", "---", "--", "ok"}, "", "ok,1\nno,---\n", false);
+  expectRun({"help", "--", "ok", "--"}, "", helpOf("t") + "ok\n", true);
+  expectRun({"deep", "help"}, "", helpOf("deep"), true);
+  expectRun({"help", "deep"}, "", invalid("help", "t"), false);
+  expectRun({"deep"}, "", helpOf("deep"), false);
+  expectRun({""}, "", invalid("", "t"), false);
+  expectRun({"deep", "nosuch", "ok"}, "", invalid("nosuch", "deep"), false);
+  expectRun({"deep", "quit"}, "", invalid("quit", "deep"), false);
+  expectRun({"quit", "now"}, "", invalid("quit", "t"), false);
+  expectRun({"quit", "--", "ok"}, "", "", true);
+  expectRun({"ok", "--", "exit", "--", "no"}, "", "ok\n", true);
+  expectRun({"back", "--", "ok"}, "", "ok\n", true);
+  expectRun({"locked", "ok"}, "", "", false);
+  expectRun({"deep", "locked", "--", "ok"}, "", "", false);
+  expectRun({"cd"}, "", helpOf("t"), false);
+  expectRun({"cd", "deep", "ok"}, "", helpOf("t"), false);
+  expectRun({"deep", "cd", "nosuch"}, "", helpOf("deep"), false);
+  expectRun({"cd", "deep", "--", "nosuch"}, "", invalid("nosuch", "t"), false);
+  expectRun({"cd", "deep/nosuch"}, "", helpOf("deep"), false);
+  expectRun({"cd", "//deep//../locked/.././.."}, "", helpOf("t"), false);
+  expectRun({"cd", "..//deep/../../locked/", "--", "cd", "///", "--", "ok"}, "", "ok\n", true);
 }
 
 TEST(CommandShell, ReadsLinesUntilTheUserLeaves) {
   const std::string p = "(/t)>> ";
-  const struct {
-    std::string input;
-    std::string output;
-    bool result;
-  } cases[] = {
-      {"", p, false},
-      {"quit\nok\n", p, true},
-      {"\n \t\v\f\r\n--\nexit", p + p + p + p, true},
-      {"  ok\ta  \"b c\\ d\"\r\nok last line", p + "ok,a,\"b,c\\,d\"\n" + p + "ok,last,line\n" + p, false},
-      {"no -- ok\nok 1 -- quit -- ok\n", p + "no\n" + p + "ok,1\n", true},
-      {"cd deep\nok\nback\nback\nquit\n", p + "(/t/deep)>> ok\n(/t/deep)>> " + p + p, true},
-      {"cd deep/nosuch\nquit\n", p + helpOf("deep") + p, true},
-      {"cd locked\ncd ../deep -- ok x -- cd ..\nquit\n", p + "(/t/locked)>> ok,x\n" + p, true},
-      {"deep\ndeep back\nquit\n", p + helpOf("deep") + p + invalid("back", "deep") + p, true},
-      {std::string("ok a\0b\n", 7), p + std::string("ok,a\0b\n", 7) + p, false},
-  };
-  for (const auto& [input, output, result] : cases) {
-    SCOPED_TRACE(input);
-    const Console console(input);
-    EXPECT_EQ(TestShell().run({"t"}), result);
-    EXPECT_EQ(console.output(), output);
-  }
+  expectRun({}, "", p, false);
+  expectRun({}, "quit\nok\n", p, true);
+  expectRun({}, "\n \t\v\f\r\n--\nexit", p + p + p + p, true);
+  expectRun({}, "  ok\ta  \"b c\\ d\"\r\nok last line",
+            p + "ok,a,\"b,c\\,d\"\n" + p + "ok,last,line\n" + p, false);
+  expectRun({}, "no -- ok\nok 1 -- quit -- ok\n", p + "no\n" + p + "ok,1\n", true);
+  expectRun({}, "cd deep\nok\nback\nback\nquit\n", p + "(/t/deep)>> ok\n(/t/deep)>> " + p + p, true);
+  expectRun({}, "cd deep/nosuch\nquit\n", p + helpOf("deep") + p, true);
+  expectRun({}, "cd locked\ncd ../deep -- ok x -- cd ..\nquit\n", p + "(/t/locked)>> ok,x\n" + p, true);
+  expectRun({}, "deep\ndeep back\nquit\n", p + helpOf("deep") + p + invalid("back", "deep") + p, true);
+  expectRun({}, std::string("ok a\0b\n", 7), p + std::string("ok,a\0b\n", 7) + p, false);
 }
 
 // clang-format on

@@ -1,3 +1,4 @@
+#include "tests/help_text.h"
 #include "tests/unit/console.h"
 #include "tests/unit/plain_node.h"
 
@@ -5,13 +6,11 @@
 
 namespace {
 
-/// That the help of a node of that content is what is between the header and the built-in words.
-void expectHelp(const PlainNode::Fill& content, const std::string& expected) {
+/// That these are the entries in the help of a node of that content.
+void expectHelp(const PlainNode::Fill& content, const std::string& entries) {
   const Console console;
   PlainNode::create("n", {}, content)->displayHelp();
-  EXPECT_EQ(console.output(), "\nOptions for command '\x1b[32mn\x1b[39m':\n\n" + expected +
-                                  "\t              cd  -  <sub-command>\n"
-                                  "\t            help\n\t            back\n\t            quit\n\n");
+  EXPECT_EQ(console.output(), helpText("n", entries));
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include "logdump/logdump_command.h"
 
 #include "logdump/os_log_context.h"
+#include "tests/help_text.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"
 #include "tests/unit/console.h"
@@ -12,18 +13,22 @@ TEST(LogdumpCommand, IsFoundBelowARootOfTheProgramsName) {
   in_process::device.programName = "mytool";
   const Console console("cd logdump\nhelp\nquit\n");
   EXPECT_TRUE(VellShell().run({"/opt/other"}));
-  EXPECT_EQ(console.output(),
-            "(/mytool)>> (/mytool/logdump)>> \nOptions for command '\x1b[32mlogdump\x1b[39m':\n\n"
-            "\t              bb  -  [nocompress|tar.gz|tar] <reason> collect baseband logs only\n\n"
-            "\t            core  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
-            "logs with coredump\n\n"
-            "\t           oslog  -  [history size] [output txt file path] -p <process1 process2..> "
-            "-i <imagePath1 imagePath2..> collect oslog to txt\n\n"
-            "\t             tel  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
-            "logs\n\n"
-            "\t              cd  -  <sub-command>\n"
-            "\t            help\n\t            back\n\t            quit\n\n"
-            "(/mytool/logdump)>> ");
+  EXPECT_EQ(
+      console.output(),
+      "(/mytool)>> (/mytool/logdump)>> " +
+          helpText(
+              "logdump",
+              "\t              bb  -  [nocompress|tar.gz|tar] <reason> collect baseband logs "
+              "only\n\n"
+              "\t            core  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
+              "logs "
+              "with coredump\n\n"
+              "\t           oslog  -  [history size] [output txt file path] -p <process1 "
+              "process2..> "
+              "-i <imagePath1 imagePath2..> collect oslog to txt\n\n"
+              "\t             tel  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
+              "logs\n\n") +
+          "(/mytool/logdump)>> ");
   EXPECT_EQ(in_process::device.clientCalls,
             (std::vector<std::string>{"CreateManager velltool velltool.queue",
                                       "RegisterEventHandler ServerStateChange", "EventsOff",
