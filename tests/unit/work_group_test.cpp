@@ -4,6 +4,7 @@
 
 #include <optional>
 #include <thread>
+#include <utility>
 
 using namespace std::chrono_literals;
 
