@@ -32,9 +32,9 @@ class Client : public testing::Test {
 
   /// Has `work` done on the queue and waits for it.
   void onQueue(const std::function<void()>& work) const {
-    std::packaged_task<void()> task(work);
-    queue.submit([&] { task(); });
-    task.get_future().wait();
+    const auto done = std::make_shared<std::promise<void>>();
+    queue.submit([&work, done] { work(), done->set_value(); });
+    done->get_future().wait();
   }
 
   std::vector<std::string> states;  // that events have told of
@@ -67,13 +67,14 @@ TEST_F(Client, DeliversNothingOnceEventsAreOff) {
   EXPECT_EQ(ask(), 0);
   onQueue([&] { EXPECT_EQ(states, std::vector<std::string>{"Started"}); });
 
-  onQueue([&] {
-    service.write("state Stopped\n");
-    service.readUntil("Event");
-    // What is answered after the event has come behind it.
-    EXPECT_EQ(ask(), 0);
-    vell::client::EventsOff(manager);
-  });
+  std::promise<void> gate;
+  queue.submit([&] { gate.get_future().wait(); });
+  service.write("state Stopped\n");
+  service.readUntil("Event");
+  // What is answered after the event has come behind it.
+  EXPECT_EQ(ask(), 0);
+  vell::client::EventsOff(manager);
+  gate.set_value();
   onQueue([&] { EXPECT_EQ(states, std::vector<std::string>{"Started"}); });
   vell::client::EventsOn(manager);
   EXPECT_EQ(ask(), 0);

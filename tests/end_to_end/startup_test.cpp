@@ -27,7 +27,6 @@ const ProcessResult kStarted = {0, rootHelp("velltool"), ""};
 
 TEST(StartUp, NeedsARadioAndADaemon) {
   const std::pair<const char*, ProcessResult> cases[] = {
-      {"RADIO_TYPE=0", kNoRadio},
       {"", kNoRadio},
       {"RADIO_TYPE=0\nPRODUCT_CODE=58", kNoRadio},
       {"RADIO_TYPE=-1", kStarted},

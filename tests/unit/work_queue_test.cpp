@@ -36,13 +36,9 @@ TEST(WorkQueue, ReleasesAClosureAsSoonAsItHasRun) {
 
 TEST(WorkQueue, MayLoseItsLastHandleOnItsOwnThread) {
   std::promise<void> done;
-  {
-    auto queue = std::make_unique<WorkQueue>(WorkQueue::create("test"));
-    auto* const raw = queue.get();
-    raw->submit([held = std::shared_ptr<WorkQueue>(std::move(queue)), &done] {
-      held->submit([&done] { done.set_value(); });
-    });
-  }
+  auto queue = std::make_shared<WorkQueue>(WorkQueue::create("test"));
+  const auto& handle = *queue;
+  handle.submit([held = std::move(queue), &done] { held->submit([&done] { done.set_value(); }); });
   done.get_future().wait();
 }
 
