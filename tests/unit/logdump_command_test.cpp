@@ -13,22 +13,15 @@ TEST(LogdumpCommand, IsFoundBelowARootOfTheProgramsName) {
   in_process::device.programName = "mytool";
   const Console console("cd logdump\nhelp\nquit\n");
   EXPECT_TRUE(VellShell().run({"/opt/other"}));
-  EXPECT_EQ(
-      console.output(),
-      "(/mytool)>> (/mytool/logdump)>> " +
-          helpText(
-              "logdump",
-              "\t              bb  -  [nocompress|tar.gz|tar] <reason> collect baseband logs "
-              "only\n\n"
-              "\t            core  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
-              "logs "
-              "with coredump\n\n"
-              "\t           oslog  -  [history size] [output txt file path] -p <process1 "
-              "process2..> "
-              "-i <imagePath1 imagePath2..> collect oslog to txt\n\n"
-              "\t             tel  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony "
-              "logs\n\n") +
-          "(/mytool/logdump)>> ");
+  const auto* entries =
+      "\t              bb  -  [nocompress|tar.gz|tar] <reason> collect baseband logs only\n\n"
+      "\t            core  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony logs with "
+      "coredump\n\n"
+      "\t           oslog  -  [history size] [output txt file path] -p <process1 process2..> "
+      "-i <imagePath1 imagePath2..> collect oslog to txt\n\n"
+      "\t             tel  -  [nocompress|tar.gz|tar] [nonui] <reason> collect telephony logs\n\n";
+  EXPECT_EQ(console.output(), "(/mytool)>> (/mytool/logdump)>> " + helpText("logdump", entries) +
+                                  "(/mytool/logdump)>> ");
   EXPECT_EQ(in_process::device.clientCalls,
             (std::vector<std::string>{"CreateManager velltool velltool.queue",
                                       "RegisterEventHandler ServerStateChange", "EventsOff",
