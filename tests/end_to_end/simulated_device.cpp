@@ -42,8 +42,8 @@ TestProcess SimulatedDevice::serve(const std::string& service) const {
 }
 
 std::string SimulatedDevice::requests() const {
-  return runLine("cd $VELL_SYSROOT/var/log/vell-simulator; cat manager.log helper.log | grep ^Perf")
-      .output;
+  const auto* line = R"(cd "$VELL_SYSROOT/var/log/vell-simulator"; cat manager.log helper.log)";
+  return runLine(line + std::string(" | grep ^Perform")).output;
 }
 
 std::string SimulatedDevice::collections() const {

@@ -8,12 +8,12 @@
 
 TEST(Simulator, HasAJournalThatTakesWhatIsLogged) {
   const SimulatedDevice device("RADIO_TYPE=1\nJOURNAL=yes");
-  const auto* line = R"(out=$VELL_SYSROOT/out.txt
-      "$0" logdump oslog 3600 $out && cut -d' ' -f7 $out | LC_ALL=C sort -u | xargs
-      "$0" logdump oslog 3600 $out -p Linkward sshd && cut -d' ' -f7- $out | sort -u
+  const auto* line = R"(cd "$VELL_SYSROOT"
+      "$0" logdump oslog 3600 out && cut -d' ' -f7 out | LC_ALL=C sort -u | xargs
+      "$0" logdump oslog 3600 out -p Linkward sshd && cut -d' ' -f7- out | sort -u
       # Each export logs what it starts with, which a later one finds.
-      until test -s $out.2; do "$0" logdump oslog 3600 $out.2 -p velltool || exit; done
-      cut -d' ' -f7- $out.2 | sort -u)";
+      until test -s own; do "$0" logdump oslog 3600 own -p velltool || exit; done
+      cut -d' ' -f7- own | sort -u)";
   const std::string expected =
       "Airgroved(Airgroved):airgroved.service Linkward(Linkward):linkward.service "
       "LinkwardMobileHelper(LinkwardMobileHelper):linkward.service "

@@ -42,7 +42,8 @@ TEST(StartUp, NeedsARadioAndADaemon) {
     EXPECT_EQ(device.runTool("help"), expected);
     if (expected == kNoDaemon) {
       // A process may be known by its executable alone.
-      const auto* line = "cd $VELL_SYSROOT/proc; mkdir 31; ln -s /opt/Linkward 31/exe; \"$0\" help";
+      const auto* line =
+          R"(cd "$VELL_SYSROOT/proc"; mkdir 31; ln -s /opt/Linkward 31/exe; "$0" help)";
       EXPECT_EQ(device.runLine(line), kStarted);
     }
   }
@@ -67,7 +68,7 @@ TEST(StartUp, ReadsCommandsFromAPipeOrATerminal) {
             (ProcessResult{
                 1, kPrompt + "(/velltool/logdump)>> " + kPrompt + kStarted.output + kPrompt, ""}));
 
-  auto onTerminal = device.start({"script", "-qec", VELLTOOL_PATH, "/dev/null"});
+  auto onTerminal = device.start({"script", "-qec", "'" VELLTOOL_PATH "'", "/dev/null"});
   // The prompt is there before anything is typed; the terminal shows what is typed.
   EXPECT_EQ(onTerminal.readUntil(">> "), kPrompt);
   onTerminal.write("logdump tel\n");
