@@ -63,11 +63,13 @@ bool WorkGroup::waitFor(std::chrono::nanoseconds timeout) const {
 LogTime currentTime() { return logDevice.now; }
 void logSystemError(const std::string& message) { logDevice.messages.push_back(message); }
 void createEmptyFile(const std::string& path) { logDevice.files[path].clear(); }
-void LogStore::prepare(const Completion& done) const { done(logDevice.source, logDevice.storeError); }
+void LogStore::prepare(const Completion& completion) const {
+  completion(logDevice.source, logDevice.storeError);
+}
 LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/) {}
 LogReader::~LogReader() = default;
 void LogReader::setFlags(unsigned flags) { logDevice.flags = flags; }
 void LogReader::setFilter(LogFilter filter) { logDevice.filter = filter; }
 void LogReader::setEntryHandler(EntryHandler handler) { logDevice.entryHandler = handler; }
-void LogReader::setInvalidationHandler(InvalidationHandler end) { logDevice.endHandler = end; }
+void LogReader::setInvalidationHandler(InvalidationHandler handler) { logDevice.endHandler = handler; }
 void LogReader::invalidate() { logDevice.invalidated = true; }

@@ -12,28 +12,26 @@ class ShellWithoutTree : public CommandShell {
   std::shared_ptr<CommandBase> createRootCommand() override { return nullptr; }
 };
 
-/// A shell over a tree of two levels with the same handlers everywhere.
+/// A shell over a tree of two levels; what is called "locked" is not allowed.
 class TestShell : public CommandShell {
   std::shared_ptr<CommandBase> createRootCommand() override {
-    const auto fill = [](PlainNode& node) { node.addHandlers({"ok", "no", "locked"}); };
-    return PlainNode::create("t", {}, [&](PlainNode& root) {
-      fill(root);
-      root.addChild("deep", fill);
-      root.addChild("locked", fill);
-      root.addChild("no", fill);
+    return PlainNode::create("t", {}, [](PlainNode& root) {
+      root.addHandlers({"ok", "no"});
+      for (const auto* name : {"deep", "locked", "no"}) {
+        root.addChild(name, [](PlainNode& node) { node.addHandlers({"ok", "no", "locked"}); });
+      }
     });
   }
 };
 
 /// The help that a node of the tree shows.
 std::string helpOf(const std::string& name) {
-  return helpText(name,
-                  "\t          locked  -  ...\n\n\t              no  -  ...\n\n"
-                  "\t              ok  -  ...\n\n" +
-                      std::string(name != "t" ? ""
-                                              : "\t            deep  -  [locked|no|ok]\n\n"
-                                                "\t          locked  -  [locked|no|ok]\n\n"
-                                                "\t              no  -  [locked|no|ok]\n\n"));
+  const std::string both = "\t              no  -  ...\n\n\t              ok  -  ...\n\n";
+  return helpText(name, name != "t" ? "\t          locked  -  ...\n\n" + both
+                                    : both +
+                                          "\t            deep  -  [locked|no|ok]\n\n"
+                                          "\t          locked  -  [locked|no|ok]\n\n"
+                                          "\t              no  -  [locked|no|ok]\n\n");
 }
 
 std::string invalid(const std::string& word, const std::string& node) {
