@@ -23,7 +23,9 @@ const std::string kOddMessage("50 %d%s\n\0\tnaïve", 16);
 /// A zone with one offset.
 struct FixedZone : TimeZone {
   explicit FixedZone(hours ahead) : offset(ahead) {}
-  std::chrono::seconds offsetAt(std::chrono::sys_seconds) const override { return offset; }
+  [[nodiscard]] std::chrono::seconds offsetAt(std::chrono::sys_seconds) const override {
+    return offset;
+  }
 
   const hours offset;
 };
