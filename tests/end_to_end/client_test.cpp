@@ -8,6 +8,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cstdlib>
 #include <future>
 
@@ -119,9 +120,12 @@ TEST_F(Client, OfTheHelperWaitsForAnAnswerWithinItsTimeLimit) {
     MessageDict request;
     request.set(vell::helper::kKeyTimeout, milliseconds);
     MessageDict reply;
+    const auto start = std::chrono::steady_clock::now();
     const auto result = vell::HelperClient::create("test", nullptr)
                             ->perform(4, vell::helper::kCommandTidewellStatus, request, reply);
+    const auto taken = std::chrono::steady_clock::now() - start;
     EXPECT_EQ(result.status == 0, milliseconds == 60000);
+    EXPECT_EQ(taken >= std::chrono::milliseconds(300), milliseconds == 60000);
     EXPECT_EQ(reply.getString(vell::helper::kKeyTimestampString), milliseconds == 60000 ? "H" : "");
   }
 }
