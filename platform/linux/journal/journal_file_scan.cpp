@@ -59,6 +59,7 @@ bool isIndexWorthwhile(std::size_t matches, std::size_t steps, std::size_t selec
 JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
     : file(std::move(found.file)),
       number(found.number),
+      grows(found.grows),
       shared(found.shared),
       // The journal takes 0 for no time.
       earliest(
@@ -70,18 +71,17 @@ JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
 void JournalFileScan::start(const LogSelection& selection) {
   started = true;
   const auto lostBefore = lostPages();
-  damaged = !reopen() || !isTailReadable();
+  damaged = !reopen() || (grows && !findEndOfFile());
   // What has damaged the file's end may have damaged its index.
   trusted = trusted && !damaged;
-  const bool mayHaveAny =
-      journal && (selection.isEverything() || findMatches(selection)) && findEnd();
+  const bool mayHaveAny = journal && (selection.isEverything() || findMatches(selection));
   damaged = damaged || lostPages() != lostBefore;
   if (journal && !hasJournalFile(journal.get())) {
     goOnWithoutIndex(0);
-  } else if (!mayHaveAny || endRealtime < earliest) {
+  } else if (!mayHaveAny || (grows && endRealtime < earliest)) {
     close(true);
   } else if (sd_journal_flush_matches(journal.get()); !seek(earliest) || !goToNext()) {
-    close(false);
+    close(timeOfLast(journal.get()) < earliest);
   }
 }
 
@@ -93,32 +93,7 @@ bool JournalFileScan::reopen() {
   return journal != nullptr;
 }
 
-/// Whether the library finds the last entry that the file has by its own account, and not, in a
-/// file that is damaged there, an earlier one.
-bool JournalFileScan::isTailReadable() {
-  const auto lastBefore = timeOfLast(journal.get());
-  std::uint64_t found = 0;
-  if (sd_journal_seek_tail(journal.get()) < 0 || sd_journal_previous(journal.get()) <= 0 ||
-      sd_journal_get_realtime_usec(journal.get(), &found) < 0) {
-    return false;
-  }
-  // Entries may have been added meanwhile.
-  return found == lastBefore || (found > lastBefore && found <= timeOfLast(journal.get()));
-}
-
-/// Asks the index which entries may be selected, and restricts the journal to them. False when it
-/// finds that there are none. The index of a file that was not closed in good order may lack some.
-bool JournalFileScan::findMatches(const LogSelection& selection) {
-  auto found = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
-  if (found && addMatches(journal.get(), *found)) {
-    matches = std::move(*found);
-    return !matches.empty();
-  }
-  sd_journal_flush_matches(journal.get());
-  return true;
-}
-
-/// Notes which entry is the last of the walk.
+/// Notes the last entry that the walk can come to as its end.
 bool JournalFileScan::findEnd() {
   if (sd_journal_seek_tail(journal.get()) < 0 || sd_journal_previous(journal.get()) <= 0 ||
       sd_journal_get_realtime_usec(journal.get(), &endRealtime) < 0) {
@@ -126,6 +101,26 @@ bool JournalFileScan::findEnd() {
   }
   endCursor = cursorOf(journal.get());
   return !endCursor.empty();
+}
+
+/// Finds the end of the file. False when that is not the last entry that the file has by its own
+/// account but, because the file is damaged there, an earlier one.
+bool JournalFileScan::findEndOfFile() {
+  const auto lastBefore = timeOfLast(journal.get());
+  // Entries may be added meanwhile.
+  return findEnd() && lastBefore <= endRealtime && endRealtime <= timeOfLast(journal.get());
+}
+
+/// Asks the index which entries may be selected, and restricts the journal to them. False when it
+/// finds that there are none. The index of a file that was not closed in good order may lack some.
+bool JournalFileScan::findMatches(const LogSelection& selection) {
+  auto found = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
+  if (!found || !addMatches(journal.get(), *found)) {
+    return true;
+  }
+  matches = std::move(*found);
+  // Going by the index, one does not come to the file's last entry, and has to know where to stop.
+  return !matches.empty() && (!grows || findEnd());
 }
 
 bool JournalFileScan::seek(std::uint64_t realtime) {
@@ -163,8 +158,11 @@ void JournalFileScan::advance(bool selected) {
   if (goToNext() && lostPages() == lostBefore) {
     return;
   }
-  // The end is an entry of the file, and it was not reached.
-  if (indexed) {
+  // A file that does not grow may simply be at its end.
+  const bool mayBeEnd = !grows && lostPages() == lostBefore && hasJournalFile(journal.get());
+  if (mayBeEnd && (indexed || currentRealtime == timeOfLast(journal.get()))) {
+    close(true);
+  } else if (indexed) {
     goOnWithoutIndex(reached);
   } else {
     close(false);
@@ -196,19 +194,19 @@ bool JournalFileScan::goToNext() {
       sd_journal_get_realtime_usec(journal.get(), &currentRealtime) < 0) {
     return false;
   }
-  atEnd = currentRealtime == endRealtime &&
+  atEnd = grows && currentRealtime == endRealtime &&
           sd_journal_test_cursor(journal.get(), endCursor.c_str()) > 0;
   return true;
 }
 
-/// The index is damaged: it ends before the entry that it named as its last, if it can be asked at
-/// all. What it does not show after the time `reached` is found by looking at every entry; to seek
-/// that time in the file would need an index, too.
+/// The index is damaged: it cannot be asked, or ends before the entry that it named as its last.
+/// What it does not show after the time `reached` is found by looking at every entry; to seek that
+/// time in the file would need an index, too.
 void JournalFileScan::goOnWithoutIndex(std::uint64_t reached) {
   damaged = true;
   indexed = false;
   matches.clear();
-  bool found = reopen() && findEnd() && seek(earliest) && goToNext();
+  bool found = reopen() && (!grows || findEnd()) && seek(earliest) && goToNext();
   while (found && currentRealtime <= reached) {
     found = !atEnd && goToNext();
   }

@@ -40,9 +40,9 @@ class JournalFileScan {
 
  private:
   bool reopen();
-  bool isTailReadable();
-  bool findMatches(const LogSelection& selection);
   bool findEnd();
+  bool findEndOfFile();
+  bool findMatches(const LogSelection& selection);
   bool seek(std::uint64_t realtime);
   void chooseWay(bool selected);
   bool goToNext();
@@ -52,10 +52,11 @@ class JournalFileScan {
   FileDescriptor file;
   JournalPtr journal;
   std::size_t number;
+  bool grows;  ///< Whether entries may still be added.
   TimeSpan shared;
   std::uint64_t earliest;  ///< Where to start.
   std::uint64_t currentRealtime;
-  std::uint64_t endRealtime = 0;
+  std::uint64_t endRealtime = 0;  ///< The end is looked for only in a file that grows.
   std::string endCursor;
   std::vector<std::string> matches;  ///< What the index can be asked for; none when it cannot be.
   bool trusted;                      ///< Whether the index can be expected to be complete.
