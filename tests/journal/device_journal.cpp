@@ -3,8 +3,6 @@
 #include <endian.h>
 
 #include <cstdlib>
-#include <fstream>
-#include <iterator>
 #include <stdexcept>
 
 namespace {
@@ -28,14 +26,6 @@ void appendField(std::string& text, const std::string& name, const std::string& 
   const std::uint64_t size = htole64(value.size());
   text.append(name).append("\n").append(reinterpret_cast<const char*>(&size), sizeof size);
   text.append(value).append("\n");
-}
-
-std::string readFile(const std::filesystem::path& path) {
-  if (!std::filesystem::is_regular_file(path)) {
-    return "";
-  }
-  std::ifstream file(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(file), {}};
 }
 
 }  // namespace
@@ -105,9 +95,18 @@ Export DeviceJournal::runWords(const std::vector<std::string>& words, const std:
   if (!result.errors.empty()) {
     throw std::runtime_error(result.errors);
   }
-  return {result.status, readFile(words.at(1)), messages()};
+  const bool isFile = std::filesystem::is_regular_file(words.at(1));
+  return {result.status, isFile ? contentOf(words.at(1)) : "", messages()};
 }
 
 std::string startedMessage(const std::string& history) {
   return "Getting oslog stream: history = " + history + ".000000";
+}
+
+std::size_t countOf(const std::string& text, const std::string& content) {
+  std::size_t count = 0;
+  for (auto at = content.find(text); at != std::string::npos; at = content.find(text, at + 1)) {
+    ++count;
+  }
+  return count;
 }

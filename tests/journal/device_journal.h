@@ -71,3 +71,6 @@ inline constexpr const char* kAllOfHistory = "2147483647";
 
 /// What every export that gets as far as the reader tells the system log.
 std::string startedMessage(const std::string& history = kAllOfHistory);
+
+/// How often `text` stands in `content`.
+std::size_t countOf(const std::string& text, const std::string& content);

@@ -15,70 +15,46 @@ std::string bytes(const char (&literal)[Size]) {
   return {literal, Size - 1};
 }
 
-constexpr std::uint64_t kTime = 1'620'133'641'999'999;  // 2021-05-04 13:07:21 UTC
-const std::string kShownTime = "2021-05-04 13:07:21 +0000";
+constexpr std::uint64_t kTime = 1'620'133'641'999'999;
+const std::string kShown = "2021-05-04 13:07:21 +0000 ";
+const std::string kNothing = kShown + "0x00000 0x0 0 (null)((null)):(null) [(null)] ";
 
 struct LineCase {
   std::vector<std::pair<std::string, std::string>> fields;
   std::string line;
 };
 
+// clang-format off
+
 TEST(ExportLines, ShowEachFieldFromWhereItIs) {
   const std::string longText(3 << 20, 'x');
   const LineCase cases[] = {
-      {{{"MESSAGE", "all"},
-        {"_SOURCE_REALTIME_TIMESTAMP", "1620133640000000"},
-        {"TID", "6699"},
-        {"_PID", "42"},
-        {"SYSLOG_PID", "43"},
-        {"VELL_ACTIVITY_ID", "1f"},
-        {"_EXE", "/usr/bin/linkd"},
-        {"_COMM", "comm"},
-        {"SYSLOG_IDENTIFIER", "ident"},
-        {"VELL_SENDER_IMAGE_PATH", "/lib/libradio.so"},
-        {"VELL_SUBSYSTEM", "org.vell"},
-        {"_SYSTEMD_UNIT", "linkd.service"},
-        {"VELL_CATEGORY", "calls"}},
+      {{{"MESSAGE", "all"}, {"_SOURCE_REALTIME_TIMESTAMP", "1620133640000000"}, {"TID", "6699"}, {"_PID", "42"},
+        {"SYSLOG_PID", "43"}, {"VELL_ACTIVITY_ID", "1f"}, {"_EXE", "/usr/bin/linkd"}, {"_COMM", "comm"},
+        {"SYSLOG_IDENTIFIER", "ident"}, {"VELL_SENDER_IMAGE_PATH", "/lib/libradio.so"}, {"VELL_SUBSYSTEM", "org.vell"},
+        {"_SYSTEMD_UNIT", "linkd.service"}, {"VELL_CATEGORY", "calls"}},
        "2021-05-04 13:07:20 +0000 0x01a2b 0x1f 42 linkd(libradio.so):org.vell [calls] all\n"},
-      {{{"MESSAGE", "second choices"},
-        {"_PID", "42"},
-        {"_EXE", "/usr/bin/linkd"},
-        {"SYSLOG_IDENTIFIER", "ident"},
+      {{{"MESSAGE", "second"}, {"_PID", "42"}, {"_EXE", "/usr/bin/linkd"}, {"SYSLOG_IDENTIFIER", "ident"},
         {"_SYSTEMD_UNIT", "linkd.service"}},
-       kShownTime + " 0x0002a 0x0 42 linkd(linkd):linkd.service [ident] second choices\n"},
-      {{{"MESSAGE", "third choices"},
-        {"SYSLOG_PID", "43"},
-        {"_COMM", "comm"},
-        {"SYSLOG_IDENTIFIER", "ident"}},
-       kShownTime + " 0x00000 0x0 43 comm((null)):(null) [ident] third choices\n"},
-      {{{"MESSAGE", "fourth choices"}, {"SYSLOG_IDENTIFIER", "ident"}},
-       kShownTime + " 0x00000 0x0 0 ident((null)):(null) [ident] fourth choices\n"},
-      {{{"MESSAGE", "nothing else"}},
-       kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] nothing else\n"},
-      {{{"MESSAGE", "odd numbers"},
-        {"_SOURCE_REALTIME_TIMESTAMP", "soon"},
-        {"TID", "-1"},
-        {"_PID", "99999999999"},
-        {"SYSLOG_PID", "7 "},
-        {"VELL_ACTIVITY_ID", "0xFFffFFffFFffFFff"}},
-       kShownTime + " 0x174876e7ff 0xffffffffffffffff 0 (null)((null)):(null) [(null)] " +
-           "odd numbers\n"},
+       kShown + "0x0002a 0x0 42 linkd(linkd):linkd.service [ident] second\n"},
+      {{{"MESSAGE", "third"}, {"SYSLOG_PID", "43"}, {"_COMM", "comm"}, {"SYSLOG_IDENTIFIER", "ident"}},
+       kShown + "0x00000 0x0 43 comm((null)):(null) [ident] third\n"},
+      {{{"MESSAGE", "fourth"}, {"SYSLOG_IDENTIFIER", "ident"}},
+       kShown + "0x00000 0x0 0 ident((null)):(null) [ident] fourth\n"},
+      {{{"MESSAGE", "nothing else"}}, kNothing + "nothing else\n"},
+      {{{"MESSAGE", "odd numbers"}, {"_SOURCE_REALTIME_TIMESTAMP", "soon"}, {"TID", "-1"}, {"_PID", "99999999999"},
+        {"SYSLOG_PID", "7 "}, {"VELL_ACTIVITY_ID", "0xFFffFFffFFffFFff"}},
+       kShown + "0x174876e7ff 0xffffffffffffffff 0 (null)((null)):(null) [(null)] odd numbers\n"},
       {{{"MESSAGE", "odd paths"}, {"_EXE", "linkd"}, {"VELL_SENDER_IMAGE_PATH", "/lib/"}},
-       kShownTime + " 0x00000 0x0 0 linkd():(null) [(null)] odd paths\n"},
+       kShown + "0x00000 0x0 0 linkd():(null) [(null)] odd paths\n"},
       {{{"MESSAGE", "empty"}, {"_EXE", ""}, {"VELL_SUBSYSTEM", ""}, {"VELL_CATEGORY", ""}},
-       kShownTime + " 0x00000 0x0 0 (): [] empty\n"},
-      {{{"MESSAGE", ""}}, kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] \n"},
-      {{{"MESSAGE", bytes("a\nb\n\n50%d %s \0 c")}},
-       kShownTime + bytes(" 0x00000 0x0 0 (null)((null)):(null) [(null)] a\nb\n\n50%d %s \0 c\n")},
-      {{{"MESSAGE", longText + "end"}},
-       kShownTime + " 0x00000 0x0 0 (null)((null)):(null) [(null)] " + longText + "end\n"},
-      {{{"MESSAGE", "ä\x80 \xE2\x82 \xED\xA0\x80 \xF0\x9F\x93"},
-        {"_COMM", "p\xFF"},
-        {"VELL_SENDER_IMAGE_PATH", "/\xFE/i\xC0\xAF"},
-        {"VELL_SUBSYSTEM", "\xC3"},
-        {"VELL_CATEGORY", "\xF5"}},
-       kShownTime + " 0x00000 0x0 0 p\uFFFD(i\uFFFD\uFFFD):\uFFFD [\uFFFD] "
-                    "ä\uFFFD \uFFFD \uFFFD\uFFFD\uFFFD \uFFFD\n"},
+       kShown + "0x00000 0x0 0 (): [] empty\n"},
+      {{{"MESSAGE", ""}}, kNothing + "\n"},
+      {{{"MESSAGE", bytes("a\nb\n\n50%d %s \0 c")}}, kNothing + bytes("a\nb\n\n50%d %s \0 c\n")},
+      {{{"MESSAGE", longText + "end"}}, kNothing + longText + "end\n"},
+      {{{"MESSAGE", "ä\x80 \xE2\x82 \xED\xA0\x80 \xF0\x9F\x93"}, {"_COMM", "p\xFF"},
+        {"VELL_SENDER_IMAGE_PATH", "/\xFE/i\xC0\xAF"}, {"VELL_SUBSYSTEM", "\xC3"}, {"VELL_CATEGORY", "\xF5"}},
+       kShown + "0x00000 0x0 0 p\uFFFD(i\uFFFD\uFFFD):\uFFFD [\uFFFD] ä\uFFFD \uFFFD \uFFFD\uFFFD\uFFFD \uFFFD\n"},
       {{{"PRIORITY", "3"}, {"_COMM", "without a message"}}, ""},
   };
   DeviceJournal device;
@@ -94,6 +70,8 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
   EXPECT_TRUE(result.content == lines) << result.content.substr(0, 2000);
   EXPECT_EQ(result.messages, std::vector{startedMessage()});
 }
+
+// clang-format on
 
 TEST(ExportLines, ShowLocalTimeAsItWasAtTheEntry) {
   const std::string summerTime = "CET-1CEST,M3.5.0,M10.5.0/3";

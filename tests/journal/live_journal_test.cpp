@@ -27,14 +27,6 @@ std::vector<StoredEntry> entries(std::size_t count, std::uint64_t start, const s
   return made;
 }
 
-std::size_t countOf(const std::string& content, const std::string& text) {
-  std::size_t count = 0;
-  for (auto at = content.find(text); at != std::string::npos; at = content.find(text, at + 1)) {
-    ++count;
-  }
-  return count;
-}
-
 /// An export to a pipe that this holds the other end of.
 class HeldUpExport {
  public:
@@ -86,7 +78,7 @@ class HeldUpExport {
 
 /// Exports until `text` has come as often as `count`.
 void awaitStored(DeviceJournal& device, const std::string& text, std::size_t count) {
-  while (countOf(device.run({"-p", text}).content, "] " + text) < count) {
+  while (countOf("] " + text, device.run({"-p", text}).content) < count) {
   }
 }
 
@@ -102,13 +94,13 @@ TEST(LiveJournal, EndsAtWhatWasStoredAtItsStart) {
   // Once reading everything, and once with the help of the index.
   for (const auto& selection : {std::vector<std::string>{"-p"}, {"-p", "old", "new"}}) {
     HeldUpExport running(device, selection);
-    const auto before = countOf(device.run({"-p", "new"}).content, "] new");
+    const auto before = countOf("] new", device.run({"-p", "new"}).content);
     storing.write(exportFormat(entries(100, kTime + kStored + before, "new")));
     awaitStored(device, "new", before + 100);
     const auto content = running.readToEnd();
     EXPECT_EQ(running.status(), 0);
-    EXPECT_EQ(countOf(content, "] old"), kStored + kRotated);
-    EXPECT_EQ(countOf(content, "] new"), before);
+    EXPECT_EQ(countOf("] old", content), kStored + kRotated);
+    EXPECT_EQ(countOf("] new", content), before);
   }
   // Nor does what is added meanwhile look like damage.
   for (const auto& message : device.messages()) {
@@ -125,7 +117,7 @@ TEST(LiveJournal, IsReadToItsEndWhenItIsRotatedAway) {
   device.store("system.journal", entries(kStored, kTime + kStored, "old"));
   HeldUpExport running(device, {"-p"});
   fs::remove_all(device.journals());
-  EXPECT_EQ(countOf(running.readToEnd(), "] old"), 2 * kStored);
+  EXPECT_EQ(countOf("] old", running.readToEnd()), 2 * kStored);
   EXPECT_EQ(running.status(), 0);
 }
 
