@@ -36,14 +36,20 @@ bool EntryCopies::isCopy(const EntryBatch::Stamp& stamp) {
   if (std::exchange(realtime, stamp.realtime) != stamp.realtime) {
     places.clear();
     sequences.clear();
+    onlyOne = stamp.cursor;
+    return false;
   }
-  // In its own sequence an entry goes by its number, and a program may well log the same twice at
-  // one time; entries of different sequences go by boot, times and the hash of their content.
-  const std::string sequence(partOf(stamp.cursor, 's'));
-  const auto known = sequences.find(partsOf(stamp.cursor, "bmtx"));
-  if (known != sequences.end() && known->second != sequence) {
-    return true;
+  if (!onlyOne.empty()) {
+    isKnown(std::exchange(onlyOne, {}));
   }
-  sequences.emplace(partsOf(stamp.cursor, "bmtx"), sequence);
-  return !places.insert(partsOf(stamp.cursor, "si")).second;
+  return isKnown(stamp.cursor);
+}
+
+/// Whether an entry is known already; if not, it is from now on. In its own sequence an entry goes
+/// by its number, and a program may well log the same twice at one time; entries of different
+/// sequences go by boot, times and the hash of their content.
+bool EntryCopies::isKnown(const std::string& cursor) {
+  const std::string sequence(partOf(cursor, 's'));
+  const auto known = sequences.emplace(partsOf(cursor, "bmtx"), sequence).first;
+  return known->second != sequence || !places.insert(partsOf(cursor, "si")).second;
 }
