@@ -111,6 +111,8 @@ TEST(ExportSelection, KeepsDifferentEntriesOfOneTime) {
       entries.push_back(message(kTime, name + std::to_string(at)));
     }
     device.store(std::string(name) + ".journal", entries);
+    // Entry by entry, and as a file below, with the numbers that the entries have.
+    device.store(std::string(name) + "@flushed.journal", entries);
   }
   std::filesystem::copy_file(device.journals() / "system.journal",
                              device.journals() / "system@copy.journal~");
