@@ -73,8 +73,8 @@ class LogReader {
 
   /// Starts delivering, oldest first, the entries that are stored when the reading starts, which is
   /// presently, and whose time is not before `from`; returns at once. To be called once. What is
-  /// logged after that is not delivered. When there is no thread to be had, the invalidation handler
-  /// is called at once, on the calling thread.
+  /// logged after that is not delivered. When there is no thread to be had, the invalidation
+  /// handler is called at once, on the calling thread.
   void activate(LogTime from);
 
   /// Stops the reader. No handler is called any more, but one call that has begun, or is about to,

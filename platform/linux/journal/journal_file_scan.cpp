@@ -49,9 +49,10 @@ std::string cursorOf(sd_journal* journal) {
 }
 
 /// With the index a step costs about 0.3 of a plain one for each match, and without it there is a
-/// step for each entry that is not selected.
+/// step for each entry that is not selected. As one more is selected than was seen, many matches
+/// take many steps to be worth it.
 bool isIndexWorthwhile(std::size_t matches, std::size_t steps, std::size_t selected) {
-  return selected * (10 + 3 * matches) < steps * 10;
+  return (selected + 1) * (10 + 3 * matches) < steps * 10;
 }
 
 }  // namespace
@@ -75,14 +76,16 @@ void JournalFileScan::start(const LogSelection& selection) {
   // What has damaged the file's end may have damaged its index.
   trusted = trusted && !damaged;
   const bool mayHaveAny = journal && (selection.isEverything() || findMatches(selection));
-  damaged = damaged || lostPages() != lostBefore;
-  if (journal && !hasJournalFile(journal.get())) {
+  // An index that lists values which no entry has is damaged.
+  const bool usable = mayHaveAny && hasJournalFile(journal.get()) && (matches.empty() || findEnd());
+  if (mayHaveAny && !usable) {
     goOnWithoutIndex(0);
-  } else if (!mayHaveAny || (grows && endRealtime < earliest)) {
+  } else if (!mayHaveAny || (!endCursor.empty() && endRealtime < earliest)) {
     close(true);
   } else if (sd_journal_flush_matches(journal.get()); !seek(earliest) || !goToNext()) {
     close(timeOfLast(journal.get()) < earliest);
   }
+  damaged = damaged || lostPages() != lostBefore;
 }
 
 /// Opens the file; it can be done again as long as there are file descriptors to be had.
@@ -106,21 +109,19 @@ bool JournalFileScan::findEnd() {
 /// Finds the end of the file. False when that is not the last entry that the file has by its own
 /// account but, because the file is damaged there, an earlier one.
 bool JournalFileScan::findEndOfFile() {
-  const auto lastBefore = timeOfLast(journal.get());
-  // Entries may be added meanwhile.
-  return findEnd() && lastBefore <= endRealtime && endRealtime <= timeOfLast(journal.get());
+  const auto last = timeOfLast(journal.get());
+  return findEnd() && last <= endRealtime;
 }
 
 /// Asks the index which entries may be selected, and restricts the journal to them. False when it
 /// finds that there are none. The index of a file that was not closed in good order may lack some.
 bool JournalFileScan::findMatches(const LogSelection& selection) {
   auto found = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
-  if (!found || !addMatches(journal.get(), *found)) {
+  if (!found || !hasJournalFile(journal.get()) || !addMatches(journal.get(), *found)) {
     return true;
   }
   matches = std::move(*found);
-  // Going by the index, one does not come to the file's last entry, and has to know where to stop.
-  return !matches.empty() && (!grows || findEnd());
+  return !matches.empty();
 }
 
 bool JournalFileScan::seek(std::uint64_t realtime) {
@@ -148,35 +149,44 @@ bool JournalFileScan::read(EntryBatch& batch) {
 }
 
 void JournalFileScan::advance(bool selected) {
-  if (atEnd) {
-    close(true);
-    return;
-  }
-  chooseWay(selected);
   const auto reached = currentRealtime;
   const auto lostBefore = lostPages();
-  if (goToNext() && lostPages() == lostBefore) {
+  if (atEnd && (matches.empty() || isEndOfIndex())) {
+    close(true);
     return;
   }
-  // A file that does not grow may simply be at its end.
-  const bool mayBeEnd = !grows && lostPages() == lostBefore && hasJournalFile(journal.get());
-  if (mayBeEnd && (indexed || currentRealtime == timeOfLast(journal.get()))) {
-    close(true);
-  } else if (indexed) {
+  if (!atEnd) {
+    chooseWay(selected);
+    if (goToNext() && lostPages() == lostBefore) {
+      return;
+    }
+  }
+  if (!matches.empty()) {
     goOnWithoutIndex(reached);
   } else {
-    close(false);
+    // One that does not grow, and whose end was not looked for, may simply be at it.
+    close(!grows && lostPages() == lostBefore && hasJournalFile(journal.get()) &&
+          currentRealtime == timeOfLast(journal.get()));
   }
+}
+
+/// Whether the index, too, has nothing after the entry that it named as its last, as far as that
+/// can be told in a file that grows.
+bool JournalFileScan::isEndOfIndex() {
+  const bool asked = indexed || addMatches(journal.get(), matches);
+  const bool found = asked && sd_journal_next(journal.get()) > 0;
+  return hasJournalFile(journal.get()) && (grows || !found);
 }
 
 /// Looks at a few entries in a row from time to time, and goes by the index in between when few of
 /// them were selected.
 void JournalFileScan::chooseWay(bool selected) {
-  constexpr unsigned kIndexedSteps = 512;
-  constexpr unsigned kPlainSteps = 32;
+  constexpr std::size_t kIndexedSteps = 512;
+  constexpr std::size_t kFewestPlainSteps = 32;
   ++steps;
   selectedSteps += selected ? 1 : 0;
-  if (matches.empty() || steps < (indexed ? kIndexedSteps : kPlainSteps)) {
+  const auto stretch = indexed ? kIndexedSteps : std::max(kFewestPlainSteps, matches.size());
+  if (matches.empty() || steps < stretch) {
     return;
   }
   const bool wasIndexed = indexed;
@@ -194,18 +204,19 @@ bool JournalFileScan::goToNext() {
       sd_journal_get_realtime_usec(journal.get(), &currentRealtime) < 0) {
     return false;
   }
-  atEnd = grows && currentRealtime == endRealtime &&
+  atEnd = currentRealtime == endRealtime &&
           sd_journal_test_cursor(journal.get(), endCursor.c_str()) > 0;
   return true;
 }
 
-/// The index is damaged: it cannot be asked, or ends before the entry that it named as its last.
-/// What it does not show after the time `reached` is found by looking at every entry; to seek that
-/// time in the file would need an index, too.
+/// The index is damaged: it cannot be asked, or ends elsewhere than it said before. What it does
+/// not show after the time `reached` is found by looking at every entry; to seek that time in the
+/// file would need an index, too.
 void JournalFileScan::goOnWithoutIndex(std::uint64_t reached) {
   damaged = true;
   indexed = false;
   matches.clear();
+  endRealtime = 0;
   bool found = reopen() && (!grows || findEnd()) && seek(earliest) && goToNext();
   while (found && currentRealtime <= reached) {
     found = !atEnd && goToNext();

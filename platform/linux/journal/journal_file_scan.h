@@ -45,6 +45,7 @@ class JournalFileScan {
   bool findMatches(const LogSelection& selection);
   bool seek(std::uint64_t realtime);
   void chooseWay(bool selected);
+  bool isEndOfIndex();
   bool goToNext();
   void goOnWithoutIndex(std::uint64_t reached);
   void close(bool complete);
@@ -56,13 +57,14 @@ class JournalFileScan {
   TimeSpan shared;
   std::uint64_t earliest;  ///< Where to start.
   std::uint64_t currentRealtime;
-  std::uint64_t endRealtime = 0;  ///< The end is looked for only in a file that grows.
+  /// That of the end, where it is known: in a file that grows, and when the index is used.
+  std::uint64_t endRealtime = 0;
   std::string endCursor;
   std::vector<std::string> matches;  ///< What the index can be asked for; none when it cannot be.
   bool trusted;                      ///< Whether the index can be expected to be complete.
   bool indexed = false;              ///< Whether steps go by the index, or else to every entry.
-  unsigned steps = 0;                ///< Since that was decided.
-  unsigned selectedSteps = 0;        ///< Those of them that left a selected entry.
+  std::size_t steps = 0;             ///< Since that was decided.
+  std::size_t selectedSteps = 0;     ///< Those of them that left a selected entry.
   bool open;
   bool started = false;
   bool atEnd = false;  ///< Whether the walk is at the last entry.

@@ -66,9 +66,9 @@ TimeSpan spanOf(sd_journal* journal, bool grows) {
     return {};
   }
   const auto endOfTime = std::numeric_limits<std::uint64_t>::max();
-  // A clock that was set back can have put the last entry before the first.
-  return found < 0 ? TimeSpan{0, endOfTime}
-                   : TimeSpan{std::min(first, last), grows ? endOfTime : std::max(first, last)};
+  // Where a clock was set back, the times between may be any.
+  return found < 0 || last < first ? TimeSpan{0, endOfTime}
+                                   : TimeSpan{first, grows ? endOfTime : last};
 }
 
 /// File descriptors that are held back while files are found, so that however many there are, some
@@ -207,6 +207,7 @@ JournalPtr openJournal(FileDescriptor file) {
   sd_journal* opened = nullptr;
   int number = file.get();
   if (number < 0) {
+    errno = EBADF;
     return nullptr;
   }
   const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);

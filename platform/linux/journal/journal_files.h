@@ -55,6 +55,6 @@ JournalFiles findJournalFiles(std::size_t atMost = std::numeric_limits<std::size
 /// lost while it is open do not end the process, see `surviveLostPages`.
 JournalPtr openJournal(FileDescriptor file);
 
-/// Whether the library still has the file of `journal`: one that it finds damaged it drops, and
-/// then goes on as if it had come to its end.
+/// Whether the library still has the file of `journal`, which takes up room on the disk: one that
+/// it finds damaged it drops, and then goes on as if it had come to its end.
 bool hasJournalFile(sd_journal* journal);

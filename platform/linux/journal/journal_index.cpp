@@ -12,11 +12,16 @@ std::string_view nameOf(JournalField field) {
   return kJournalFieldNames[indexOf(field)];
 }
 
+/// What is found in the index.
+struct Finding {
+  std::vector<std::string> matches;
+  bool hasValues = false;  ///< Whether there was any value, wanted or not.
+};
+
 /// Adds a match for each of the distinct values of `field` that is `wanted`. False when the index
 /// cannot list them all.
 bool addWantedValues(sd_journal* journal, JournalField field,
-                     const std::function<bool(std::string_view)>& wanted,
-                     std::vector<std::string>& matches) {
+                     const std::function<bool(std::string_view)>& wanted, Finding& finding) {
   const std::string name(nameOf(field));
   if (sd_journal_query_unique(journal, name.c_str()) < 0) {
     return false;
@@ -26,8 +31,9 @@ bool addWantedValues(sd_journal* journal, JournalField field,
   int more = sd_journal_enumerate_unique(journal, &data, &length);
   for (; more > 0; more = sd_journal_enumerate_unique(journal, &data, &length)) {
     const std::string_view match(static_cast<const char*>(data), length);
+    finding.hasValues = true;
     if (wanted(match.substr(name.size() + 1))) {
-      matches.emplace_back(match);
+      finding.matches.emplace_back(match);
     }
   }
   return more == 0;
@@ -42,9 +48,9 @@ std::optional<std::vector<std::string>> findIndexMatches(sd_journal* journal,
   const auto selectsExecutable = [&](std::string_view path) {
     return selectsName(lastComponent(path)) || selectsPath(path);
   };
-  std::vector<std::string> matches;
+  Finding finding;
   const auto add = [&](JournalField field, const auto& wanted) {
-    return addWantedValues(journal, field, wanted, matches);
+    return addWantedValues(journal, field, wanted, finding);
   };
   // An entry without an executable goes by its other names, and one with an executable has them
   // too: what they match in vain is asked and passed over.
@@ -52,5 +58,6 @@ std::optional<std::vector<std::string>> findIndexMatches(sd_journal* journal,
                       add(JournalField::SenderImagePath, selectsPath) &&
                       add(JournalField::CommandName, selectsName) &&
                       add(JournalField::SyslogIdentifier, selectsName);
-  return listed ? std::optional(std::move(matches)) : std::nullopt;
+  // Entries hardly ever have none of these fields, and an index that knows of none is damaged.
+  return listed && finding.hasValues ? std::optional(std::move(finding.matches)) : std::nullopt;
 }

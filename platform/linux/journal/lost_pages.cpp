@@ -23,12 +23,15 @@ bool replacePage(void* address) {
   return mmap(page, pageSize, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED, -1, 0) == page;
 }
 
-void handleBusError(int /*number*/, siginfo_t* info, void* /*context*/) {
+void handleBusError(int number, siginfo_t* info, void* /*context*/) {
   if (survives != 0 && info->si_code == BUS_ADRERR && replacePage(info->si_addr)) {
     lost = lost + 1;
-  } else {
-    // What touched the page does so again, and meets what was there before.
-    sigaction(SIGBUS, &formerAction, nullptr);
+    return;
+  }
+  // What touched the page does so again, and meets what was there before; what was sent is sent on.
+  sigaction(SIGBUS, &formerAction, nullptr);
+  if (info->si_code != BUS_ADRERR) {
+    raise(number);
   }
 }
 
