@@ -32,8 +32,8 @@ namespace {
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
 
-/// While the entries of one file are delivered, those of the next are read. More threads would be
-/// ahead of the one that delivers, to no avail.
+/// While the entries of one file are delivered, those of the next are read. On two cores two
+/// threads are as many as have work to do.
 constexpr std::size_t kReadingThreads = 2;
 
 /// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
