@@ -103,10 +103,10 @@ ModelEntry makeEntry(Chance& chance, std::uint64_t realtime, const std::string& 
 /// Journals in which times are shared within a file, but not between files.
 std::vector<std::vector<ModelEntry>> makeFiles(Chance& chance) {
   constexpr std::uint64_t kTime = 1'620'133'641'000'000;
-  std::vector<std::vector<ModelEntry>> files(1 + chance.below(3));
+  std::vector<std::vector<ModelEntry>> files(1 + chance.below(6));
   const std::size_t longest = chance.oneOf<std::size_t>({40, 400, 4000});
   for (std::size_t file = 0; file < files.size(); ++file) {
-    std::uint64_t time = kTime + file;
+    std::uint64_t time = kTime + file + files.size() * chance.below(2 * longest);
     const auto count = 1 + chance.below(longest);
     // Where many entries match it is not the index that is gone by, and that changes on the way.
     std::size_t oneIn = 1;
@@ -205,7 +205,9 @@ TEST(ExportProperty, IsWhatAPlainFilterGives) {
       std::vector<StoredEntry> stored;
       std::transform(files[file].begin(), files[file].end(), std::back_inserter(stored),
                      [](const ModelEntry& entry) { return entry.stored; });
-      device.store((file == 0 ? "system" : "user-" + std::to_string(file)) + ".journal", stored);
+      // Some are written to no more.
+      device.store((chance.below(3) == 0 ? "user-" : "system@") + std::to_string(file) + ".journal",
+                   stored);
     }
     for (int selections = 0; selections < 15; ++selections) {
       const auto selection = makeSelection(chance);

@@ -17,6 +17,8 @@ class JournalFileScan {
   /// A walk that is not started.
   JournalFileScan(JournalFile found, LogTime from);
 
+  [[nodiscard]] std::size_t fileNumber() const { return number; }
+
   /// Whether there may be entries to come. When there are none, the file is closed.
   [[nodiscard]] bool isOpen() const { return open; }
 

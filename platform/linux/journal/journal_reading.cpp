@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <functional>
+#include <limits>
 #include <tuple>
 #include <utility>
 
@@ -15,26 +16,25 @@ constexpr std::size_t kStepsAtOnce = 4096;
 }  // namespace
 
 bool JournalReading::Turn::operator>(const Turn& other) const {
-  return std::tie(realtime, scan) > std::tie(other.realtime, other.scan);
+  return std::tie(realtime, number) > std::tie(other.realtime, other.number);
 }
 
-JournalReading::JournalReading(std::vector<JournalFile> files,
-                               const std::optional<LogFilter>& filter, LogTime from)
-    : selection(filter), start(from) {
-  for (auto& file : files) {
-    const bool grows = file.grows;
-    scans.emplace_back(std::move(file), from);
-    // The end of a file that does not change can wait to be found until its turn comes.
-    if (grows && scans.back().isOpen()) {
-      scans.back().start(selection);
+JournalReading::JournalReading(JournalFileQueue& queue, const std::optional<LogFilter>& filter,
+                               LogTime from)
+    : selection(filter), start(from), files(queue) {
+  // The end of a file that does not change can wait to be found until its turn comes.
+  while (auto file = files.takeGrowing()) {
+    auto& scan = add(std::move(*file));
+    if (scan.isOpen()) {
+      scan.start(selection);
     }
-    waitForTurn(scans.size() - 1);
+    waitForTurn(scan);
   }
 }
 
 bool JournalReading::read(EntryBatch& batch) {
   for (std::size_t steps = 0; steps < kStepsAtOnce && !batch.isFull(); ++steps) {
-    if (!current && !takeTurn()) {
+    if (current == nullptr && !takeTurn()) {
       return false;
     }
     advance(readEntry(batch));
@@ -42,15 +42,10 @@ bool JournalReading::read(EntryBatch& batch) {
   return true;
 }
 
-bool JournalReading::isComplete() const {
-  return std::none_of(scans.begin(), scans.end(),
-                      [](const JournalFileScan& scan) { return scan.isDamaged(); });
-}
-
 /// Puts the current file's entry into `batch`, if it can be read and is wanted, and returns whether
 /// that is so.
 bool JournalReading::readEntry(EntryBatch& batch) {
-  if (!scans[*current].read(batch)) {
+  if (!current->read(batch)) {
     return false;
   }
   const bool wanted = isWanted(batch);
@@ -69,32 +64,59 @@ bool JournalReading::isWanted(const EntryBatch& batch) const {
 
 /// Goes to the current file's next entry, and lets another file have its turn if that is older.
 void JournalReading::advance(bool selected) {
-  auto& scan = scans[*current];
-  scan.advance(selected);
-  if (!scan.isOpen() || (!turns.empty() && Turn{scan.realtime(), *current} > turns.front())) {
-    waitForTurn(*std::exchange(current, std::nullopt));
-  }
-}
-
-void JournalReading::waitForTurn(std::size_t scan) {
-  if (scans[scan].isOpen()) {
-    turns.push_back({scans[scan].realtime(), scan});
-    std::push_heap(turns.begin(), turns.end(), std::greater<>());
+  current->advance(selected);
+  const Turn next{current->realtime(), current->fileNumber()};
+  if (!current->isOpen() || files.firstRealtime() <= next.realtime ||
+      (!turns.empty() && next > turns.front())) {
+    waitForTurn(*std::exchange(current, nullptr));
   }
 }
 
 /// Gives the turn to the file whose next entry is the oldest. False when no file has one left.
 bool JournalReading::takeTurn() {
-  while (!current && !turns.empty()) {
+  while (current == nullptr) {
+    while (takeFile()) {
+    }
+    if (turns.empty()) {
+      return false;
+    }
     std::pop_heap(turns.begin(), turns.end(), std::greater<>());
-    const auto next = turns.back().scan;
+    auto& next = scans.at(turns.back().number);
     turns.pop_back();
-    if (scans[next].isStarted()) {
-      current = next;
+    if (next.isStarted()) {
+      current = &next;
     } else {
-      scans[next].start(selection);
+      next.start(selection);
       waitForTurn(next);
     }
   }
-  return current.has_value();
+  return true;
+}
+
+/// Takes a file that nobody reads, when it may have an entry that is older than any other here.
+bool JournalReading::takeFile() {
+  constexpr Turn kEnd{std::numeric_limits<std::uint64_t>::max(),
+                      std::numeric_limits<std::size_t>::max()};
+  const auto& limit = turns.empty() ? kEnd : turns.front();
+  auto file = files.takeBefore(limit.realtime, limit.number);
+  if (file) {
+    waitForTurn(add(std::move(*file)));
+  }
+  return file.has_value();
+}
+
+JournalFileScan& JournalReading::add(JournalFile file) {
+  const auto number = file.number;
+  return scans.try_emplace(number, std::move(file), start).first->second;
+}
+
+/// Has the scan wait, or go when it has come to its end.
+void JournalReading::waitForTurn(JournalFileScan& scan) {
+  if (scan.isOpen()) {
+    turns.push_back({scan.realtime(), scan.fileNumber()});
+    std::push_heap(turns.begin(), turns.end(), std::greater<>());
+  } else {
+    complete = complete && !scan.isDamaged();
+    scans.erase(scan.fileNumber());
+  }
 }

@@ -136,14 +136,10 @@ unsigned long LogReader::Session::deliverAll(LogTime from) {
 /// missing.
 bool LogReader::Session::readAll(LogTime from) {
   auto files = findJournalFiles();
-  // Files that follow each other are read at the same time.
-  std::array<std::vector<JournalFile>, kReadingThreads> shares;
-  for (auto& file : files.found) {
-    shares.at(file.number % kReadingThreads).push_back(std::move(file));
-  }
+  JournalFileQueue queue(std::move(files.found));
   std::list<ReadingThread> threads;
-  for (std::size_t share = 0; share < kReadingThreads; ++share) {
-    threads.emplace_back(std::move(shares.at(share)), filter, from, pipes.at(share));
+  for (auto& pipe : pipes) {
+    threads.emplace_back(queue, filter, from, pipe);
   }
   EntryMerge entries(pipes);
   while (!stopped && entries.next()) {

@@ -5,12 +5,10 @@
 #include <new>
 #include <utility>
 
-ReadingThread::ReadingThread(std::vector<JournalFile> files, std::optional<LogFilter> filter,
-                             LogTime from, EntryPipe& into)
+ReadingThread::ReadingThread(JournalFileQueue& files, std::optional<LogFilter> filter, LogTime from,
+                             EntryPipe& into)
     : pipe(into),
-      thread([this, files = std::move(files), filter = std::move(filter), from]() mutable {
-        run(std::move(files), filter, from);
-      }) {}
+      thread([this, &files, filter = std::move(filter), from] { run(files, filter, from); }) {}
 
 ReadingThread::~ReadingThread() {
   pipe.close();
@@ -24,10 +22,10 @@ bool ReadingThread::finish() {
   return complete;
 }
 
-void ReadingThread::run(std::vector<JournalFile> files, const std::optional<LogFilter>& filter,
+void ReadingThread::run(JournalFileQueue& files, const std::optional<LogFilter>& filter,
                         LogTime from) {
   try {
-    JournalReading reading(std::move(files), filter, from);
+    JournalReading reading(files, filter, from);
     EntryBatch batch;
     bool more = true;
     while (more) {

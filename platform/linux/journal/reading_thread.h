@@ -2,20 +2,19 @@
 
 #include "platform/clock.h"
 #include "platform/linux/journal/entry_pipe.h"
-#include "platform/linux/journal/journal_files.h"
+#include "platform/linux/journal/journal_file_queue.h"
 #include "platform/log_filter.h"
 
 #include <optional>
 #include <thread>
-#include <vector>
 
-/// Reads some of the journal files on a thread of its own, from which the selected entries come
-/// through a pipe, oldest first.
+/// Reads journal files on a thread of its own, from which the selected entries come through a pipe,
+/// oldest first.
 class ReadingThread {
  public:
-  /// Starts to read. The pipe must last longer. Throws std::system_error when there is no thread to
-  /// be had.
-  ReadingThread(std::vector<JournalFile> files, std::optional<LogFilter> filter, LogTime from,
+  /// Starts to read what it gets of `files`. They and the pipe must last longer. Throws
+  /// std::system_error when there is no thread to be had.
+  ReadingThread(JournalFileQueue& files, std::optional<LogFilter> filter, LogTime from,
                 EntryPipe& into);
   ReadingThread(const ReadingThread&) = delete;
   ReadingThread& operator=(const ReadingThread&) = delete;
@@ -28,7 +27,7 @@ class ReadingThread {
   bool finish();
 
  private:
-  void run(std::vector<JournalFile> files, const std::optional<LogFilter>& filter, LogTime from);
+  void run(JournalFileQueue& files, const std::optional<LogFilter>& filter, LogTime from);
 
   EntryPipe& pipe;
   bool complete = false;  ///< Belongs to the thread until it has ended.
