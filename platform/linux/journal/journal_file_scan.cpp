@@ -48,13 +48,6 @@ std::string cursorOf(sd_journal* journal) {
   return text;
 }
 
-/// With the index a step costs about 0.3 of a plain one for each match, and without it there is a
-/// step for each entry that is not selected. As one more is selected than was seen, many matches
-/// take many steps to be worth it.
-bool isIndexWorthwhile(std::size_t matches, std::size_t steps, std::size_t selected) {
-  return (selected + 1) * (10 + 3 * matches) < steps * 10;
-}
-
 }  // namespace
 
 JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
@@ -121,6 +114,7 @@ bool JournalFileScan::findMatches(const LogSelection& selection) {
     return true;
   }
   matches = std::move(*found);
+  way = WayChoice(matches.size());
   return !matches.empty();
 }
 
@@ -178,25 +172,15 @@ bool JournalFileScan::isEndOfIndex() {
   return hasJournalFile(journal.get()) && (grows || !found);
 }
 
-/// Looks at a few entries in a row from time to time, and goes by the index in between when few of
-/// them were selected.
+/// Has the next step go by the index, or to every entry, whichever is better here.
 void JournalFileScan::chooseWay(bool selected) {
-  constexpr std::size_t kIndexedSteps = 512;
-  constexpr std::size_t kFewestPlainSteps = 32;
-  ++steps;
-  selectedSteps += selected ? 1 : 0;
-  const auto stretch = indexed ? kIndexedSteps : std::max(kFewestPlainSteps, matches.size());
-  if (matches.empty() || steps < stretch) {
-    return;
+  way.noteStep(selected);
+  if (way.isByIndex() != indexed) {
+    indexed = !indexed && addMatches(journal.get(), matches);
+    if (!indexed) {
+      sd_journal_flush_matches(journal.get());
+    }
   }
-  const bool wasIndexed = indexed;
-  indexed = !wasIndexed && isIndexWorthwhile(matches.size(), steps, selectedSteps) &&
-            addMatches(journal.get(), matches);
-  if (!indexed) {
-    sd_journal_flush_matches(journal.get());
-  }
-  steps = 0;
-  selectedSteps = 0;
 }
 
 bool JournalFileScan::goToNext() {
@@ -216,6 +200,7 @@ void JournalFileScan::goOnWithoutIndex(std::uint64_t reached) {
   damaged = true;
   indexed = false;
   matches.clear();
+  way = WayChoice(0);
   endRealtime = 0;
   bool found = reopen() && (!grows || findEnd()) && seek(earliest) && goToNext();
   while (found && currentRealtime <= reached) {

@@ -4,6 +4,7 @@
 #include "platform/linux/journal/entry_batch.h"
 #include "platform/linux/journal/journal_files.h"
 #include "platform/linux/journal/log_selection.h"
+#include "platform/linux/journal/way_choice.h"
 
 #include <cstdint>
 #include <string>
@@ -64,9 +65,8 @@ class JournalFileScan {
   std::string endCursor;
   std::vector<std::string> matches;  ///< What the index can be asked for; none when it cannot be.
   bool trusted;                      ///< Whether the index can be expected to be complete.
-  bool indexed = false;              ///< Whether steps go by the index, or else to every entry.
-  std::size_t steps = 0;             ///< Since that was decided.
-  std::size_t selectedSteps = 0;     ///< Those of them that left a selected entry.
+  WayChoice way{0};
+  bool indexed = false;  ///< Whether steps go by the index, or else to every entry.
   bool open;
   bool started = false;
   bool atEnd = false;  ///< Whether the walk is at the last entry.
