@@ -28,6 +28,9 @@ void EntryBatch::dropLast() {
 
 void EntryBatch::clear() {
   bytes.clear();
+  if (bytes.capacity() > 2 * kMostBytes) {
+    bytes.shrink_to_fit();
+  }
   entries.clear();
 }
 

@@ -27,6 +27,7 @@ class EntryBatch {
   /// Takes back the entry begun last.
   void dropLast();
 
+  /// Takes back all entries, and gives back the memory of a batch that was larger than usual.
   void clear();
 
   [[nodiscard]] std::size_t size() const { return entries.size(); }
@@ -34,6 +35,9 @@ class EntryBatch {
 
   /// Whether it is time to hand the batch on.
   [[nodiscard]] bool isFull() const;
+
+  /// The size of all values together.
+  [[nodiscard]] std::size_t byteCount() const { return bytes.size(); }
 
   [[nodiscard]] const Stamp& stampOf(std::size_t entry) const { return entries[entry].stamp; }
 

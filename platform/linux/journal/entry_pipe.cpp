@@ -5,18 +5,20 @@
 namespace {
 
 constexpr std::size_t kMostFilled = 24;
+constexpr std::size_t kMostBytes = 6UL * 1024 * 1024;
 
 }  // namespace
 
 bool EntryPipe::push(EntryBatch& batch) {
   std::unique_lock lock(mutex);
-  changed.wait(lock, [this] { return closed || filled.size() < kMostFilled; });
+  changed.wait(lock, [&] { return closed || hasRoomFor(batch); });
   if (closed) {
     return false;
   }
   if (batch.isEmpty()) {
     return true;
   }
+  filledBytes += batch.byteCount();
   filled.push_back(std::move(batch));
   batch = EntryBatch();
   if (!emptied.empty()) {
@@ -25,6 +27,12 @@ bool EntryPipe::push(EntryBatch& batch) {
   }
   changed.notify_all();
   return true;
+}
+
+/// Whether what is under way stays within bounds; one batch can go, however long its messages are.
+bool EntryPipe::hasRoomFor(const EntryBatch& batch) const {
+  return filled.empty() ||
+         (filled.size() < kMostFilled && filledBytes + batch.byteCount() <= kMostBytes);
 }
 
 void EntryPipe::finish() {
@@ -43,6 +51,7 @@ bool EntryPipe::pop(EntryBatch& batch) {
   }
   batch = std::move(filled.front());
   filled.pop_front();
+  filledBytes -= batch.byteCount();
   changed.notify_all();
   return true;
 }

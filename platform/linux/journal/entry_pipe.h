@@ -7,7 +7,7 @@
 #include <mutex>
 #include <vector>
 
-/// Carries batches from a thread that reads to the thread that delivers, so many at a time that the
+/// Carries batches from a thread that reads to the thread that delivers, so much at a time that the
 /// one can be ahead of the other, and the emptied ones back.
 class EntryPipe {
  public:
@@ -26,9 +26,12 @@ class EntryPipe {
   void close();
 
  private:
+  [[nodiscard]] bool hasRoomFor(const EntryBatch& batch) const;
+
   std::mutex mutex;
   std::condition_variable changed;
   std::deque<EntryBatch> filled;    ///< Guarded by `mutex`.
+  std::size_t filledBytes = 0;      ///< In all of these. Guarded by `mutex`.
   std::vector<EntryBatch> emptied;  ///< Guarded by `mutex`.
   bool finished = false;            ///< Guarded by `mutex`.
   bool closed = false;              ///< Guarded by `mutex`.
