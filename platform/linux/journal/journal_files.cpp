@@ -19,7 +19,7 @@
 
 namespace {
 
-/// The path of one folder and what lies in it; nothing when it cannot be read.
+/// What lies in one folder, in the order of the paths; nothing when it cannot be read.
 struct Folder {
   std::vector<std::filesystem::path> contents;
   int error = 0;
@@ -30,6 +30,7 @@ struct Folder {
     for (; !failure && entry != std::filesystem::directory_iterator(); entry.increment(failure)) {
       contents.push_back(entry->path());
     }
+    std::sort(contents.begin(), contents.end());
     error = failure == std::errc::no_such_file_or_directory || failure == std::errc::not_a_directory
                 ? 0
                 : failure.value();
@@ -203,13 +204,12 @@ JournalFiles findJournalFiles(std::size_t atMost) {
 }
 
 JournalPtr openJournal(FileDescriptor file) {
+  if (!file) {
+    return nullptr;
+  }
   surviveLostPages();
   sd_journal* opened = nullptr;
   int number = file.get();
-  if (number < 0) {
-    errno = EBADF;
-    return nullptr;
-  }
   const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);
   if (result < 0) {
     errno = -result;

@@ -51,7 +51,8 @@ struct JournalFiles {
 /// hard limit allows. From any thread.
 JournalFiles findJournalFiles(std::size_t atMost = std::numeric_limits<std::size_t>::max());
 
-/// Opens the journal in `file`; null, and errno is set, when that fails. Pages of the file that are
+/// Opens the journal in `file`; null, and errno is set, when that fails; null, and errno is as it
+/// was, when there is no `file`. Pages of the file that are
 /// lost while it is open do not end the process, see `surviveLostPages`.
 JournalPtr openJournal(FileDescriptor file);
 
