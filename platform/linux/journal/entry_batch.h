@@ -11,9 +11,10 @@
 /// values of all of them lie one after the other in one piece of memory, which is used again.
 class EntryBatch {
  public:
-  /// When an entry was stored, in microseconds, in which file, and where there.
+  /// When an entry was stored, in which file, and where there; times in microseconds.
   struct Stamp {
     std::uint64_t realtime = 0;
+    std::uint64_t reached = 0;  ///< The latest time that the walk through its file has come to.
     std::size_t file = 0;
     std::string cursor;  ///< Empty when no other file has entries of that time.
   };

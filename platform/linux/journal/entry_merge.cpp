@@ -32,7 +32,7 @@ bool EntryMerge::goToOldest() {
       std::min_element(sources.begin(), sources.end(), [](const Source& left, const Source& right) {
         const auto& first = left.batch.stampOf(left.at);
         const auto& second = right.batch.stampOf(right.at);
-        return std::tie(first.realtime, first.file) < std::tie(second.realtime, second.file);
+        return std::tie(first.reached, first.file) < std::tie(second.reached, second.file);
       });
   current = oldest != sources.end() ? &*oldest : nullptr;
   return current != nullptr;

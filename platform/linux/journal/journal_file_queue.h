@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/clock.h"
 #include "platform/linux/journal/journal_files.h"
 
 #include <atomic>
@@ -14,25 +15,27 @@
 /// whichever comes to a file first takes it. From any thread.
 class JournalFileQueue {
  public:
-  /// Lets `files` wait, which are in that order.
-  explicit JournalFileQueue(std::vector<JournalFile> files);
+  /// Lets those of `files` wait that have entries from a point in time on. They are in the order of
+  /// their first entries.
+  JournalFileQueue(std::vector<JournalFile> files, LogTime from);
 
-  /// Takes a file that grows. They do not wait like the others, so that all of them are soon
-  /// opened.
-  std::optional<JournalFile> takeGrowing();
+  /// Takes what each of some readers starts with: the files that grow are shared out, so that all
+  /// of them are opened at once, and each reader gets one of the others, so that those which begin
+  /// at one time are read at the same time.
+  std::vector<std::vector<JournalFile>> takeFirst(std::size_t readers);
 
-  /// Takes the first of the others if an entry of it may come before one that was stored at
-  /// `realtime` in the file `number`.
+  /// Takes the file in front if its first entry may come before one of the file `number` that is
+  /// stored at `realtime`.
   std::optional<JournalFile> takeBefore(std::uint64_t realtime, std::size_t number);
 
-  /// No entry of these others was stored before this, in microseconds.
+  /// Of the files that wait, none has its first entry before this, in microseconds.
   [[nodiscard]] std::uint64_t firstRealtime() const { return first; }
 
  private:
-  void noteFirst();
+  std::optional<JournalFile> take();
 
   std::mutex mutex;
-  std::deque<JournalFile> growing;  ///< Guarded by `mutex`.
-  std::deque<JournalFile> closed;   ///< Guarded by `mutex`.
-  std::atomic<std::uint64_t> first;
+  std::vector<JournalFile> growing;  ///< Guarded by `mutex`.
+  std::deque<JournalFile> waiting;   ///< Guarded by `mutex`.
+  std::atomic<std::uint64_t> first = 0;
 };

@@ -55,10 +55,9 @@ JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
       number(found.number),
       grows(found.grows),
       shared(found.shared),
-      // The journal takes 0 for no time.
-      earliest(
-          static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 1))),
+      earliest(journalTime(from)),
       currentRealtime(std::max(found.stored.first, earliest)),
+      latestRealtime(currentRealtime),
       trusted(found.wasClosed),
       open(found.stored.holds(currentRealtime)) {}
 
@@ -124,7 +123,7 @@ bool JournalFileScan::seek(std::uint64_t realtime) {
 
 bool JournalFileScan::read(EntryBatch& batch) {
   // A cursor is slow to be had, and is there to tell the entries of one time from each other.
-  batch.begin({currentRealtime, number,
+  batch.begin({currentRealtime, latestRealtime, number,
                shared.holds(currentRealtime) ? cursorOf(journal.get()) : std::string()});
   const auto lostBefore = lostPages();
   const void* data = nullptr;
@@ -143,7 +142,7 @@ bool JournalFileScan::read(EntryBatch& batch) {
 }
 
 void JournalFileScan::advance(bool selected) {
-  const auto reached = currentRealtime;
+  const auto left = currentRealtime;
   const auto lostBefore = lostPages();
   if (atEnd && (matches.empty() || isEndOfIndex())) {
     close(true);
@@ -156,7 +155,7 @@ void JournalFileScan::advance(bool selected) {
     }
   }
   if (!matches.empty()) {
-    goOnWithoutIndex(reached);
+    goOnWithoutIndex(left);
   } else {
     // One that does not grow, and whose end was not looked for, may simply be at it.
     close(!grows && lostPages() == lostBefore && hasJournalFile(journal.get()) &&
@@ -188,22 +187,23 @@ bool JournalFileScan::goToNext() {
       sd_journal_get_realtime_usec(journal.get(), &currentRealtime) < 0) {
     return false;
   }
+  latestRealtime = std::max(latestRealtime, currentRealtime);
   atEnd = currentRealtime == endRealtime &&
           sd_journal_test_cursor(journal.get(), endCursor.c_str()) > 0;
   return true;
 }
 
 /// The index is damaged: it cannot be asked, or ends elsewhere than it said before. What it does
-/// not show after the time `reached` is found by looking at every entry; to seek that time in the
+/// not show after the time `left` is found by looking at every entry; to seek that time in the
 /// file would need an index, too.
-void JournalFileScan::goOnWithoutIndex(std::uint64_t reached) {
+void JournalFileScan::goOnWithoutIndex(std::uint64_t left) {
   damaged = true;
   indexed = false;
   matches.clear();
   way = WayChoice(0);
   endRealtime = 0;
   bool found = reopen() && (!grows || findEnd()) && seek(earliest) && goToNext();
-  while (found && currentRealtime <= reached) {
+  while (found && currentRealtime <= left) {
     found = !atEnd && goToNext();
   }
   if (!found) {

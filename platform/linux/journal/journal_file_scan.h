@@ -31,9 +31,10 @@ class JournalFileScan {
   /// Whether something in the file could not be read, and is missing.
   [[nodiscard]] bool isDamaged() const { return damaged; }
 
-  /// When the entry at which the walk is was stored, in microseconds; of a walk that is not started
-  /// no later than its first entry. It never goes back, but in a file whose machine's clock did.
-  [[nodiscard]] std::uint64_t realtime() const { return currentRealtime; }
+  /// When the entry at which the walk is was stored, in microseconds, or an earlier one if that was
+  /// later, as the machine's clock may have been set back; of a walk that is not started no later
+  /// than its first entry.
+  [[nodiscard]] std::uint64_t reached() const { return latestRealtime; }
 
   /// Puts the entry into `batch`. False, with nothing put there, when it cannot be read.
   bool read(EntryBatch& batch);
@@ -50,7 +51,7 @@ class JournalFileScan {
   void chooseWay(bool selected);
   bool isEndOfIndex();
   bool goToNext();
-  void goOnWithoutIndex(std::uint64_t reached);
+  void goOnWithoutIndex(std::uint64_t left);
   void close(bool complete);
 
   FileDescriptor file;
@@ -60,6 +61,7 @@ class JournalFileScan {
   TimeSpan shared;
   std::uint64_t earliest;  ///< Where to start.
   std::uint64_t currentRealtime;
+  std::uint64_t latestRealtime;
   /// That of the end, where it is known: in a file that grows, and when the index is used.
   std::uint64_t endRealtime = 0;
   std::string endCursor;

@@ -185,6 +185,10 @@ void liftFileLimit() {
 
 }  // namespace
 
+std::uint64_t journalTime(LogTime time) {
+  return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
+}
+
 JournalFiles findJournalFiles(std::size_t atMost) {
   liftFileLimit();
   const HeldBackDescriptors heldBack;

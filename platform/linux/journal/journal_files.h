@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/clock.h"
 #include "platform/linux/file_descriptor.h"
 
 #include <systemd/sd-journal.h>
@@ -16,6 +17,9 @@ struct JournalCloser {
 
 /// Owns an open journal. It is opened, used and closed on one thread, see sd-journal(3).
 using JournalPtr = std::unique_ptr<sd_journal, JournalCloser>;
+
+/// A point in time as the journal has it, in microseconds; it takes 0 for none.
+std::uint64_t journalTime(LogTime time);
 
 /// From when to when, in microseconds, both included; no time at all when `last` is before `first`.
 struct TimeSpan {

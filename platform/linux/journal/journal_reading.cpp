@@ -16,16 +16,17 @@ constexpr std::size_t kStepsAtOnce = 4096;
 }  // namespace
 
 bool JournalReading::Turn::operator>(const Turn& other) const {
-  return std::tie(realtime, number) > std::tie(other.realtime, other.number);
+  return std::tie(reached, number) > std::tie(other.reached, other.number);
 }
 
-JournalReading::JournalReading(JournalFileQueue& queue, const std::optional<LogFilter>& filter,
-                               LogTime from)
-    : selection(filter), start(from), files(queue) {
-  // The end of a file that does not change can wait to be found until its turn comes.
-  while (auto file = files.takeGrowing()) {
-    auto& scan = add(std::move(*file));
-    if (scan.isOpen()) {
+JournalReading::JournalReading(std::vector<JournalFile> own, JournalFileQueue& others,
+                               const std::optional<LogFilter>& filter, LogTime from)
+    : selection(filter), start(from), files(others) {
+  for (auto& file : own) {
+    const bool grows = file.grows;
+    auto& scan = add(std::move(file));
+    // The end of a file that does not change can wait to be found until its turn comes.
+    if (grows && scan.isOpen()) {
       scan.start(selection);
     }
     waitForTurn(scan);
@@ -65,8 +66,8 @@ bool JournalReading::isWanted(const EntryBatch& batch) const {
 /// Goes to the current file's next entry, and lets another file have its turn if that is older.
 void JournalReading::advance(bool selected) {
   current->advance(selected);
-  const Turn next{current->realtime(), current->fileNumber()};
-  if (!current->isOpen() || files.firstRealtime() <= next.realtime ||
+  const Turn next{current->reached(), current->fileNumber()};
+  if (!current->isOpen() || files.firstRealtime() <= next.reached ||
       (!turns.empty() && next > turns.front())) {
     waitForTurn(*std::exchange(current, nullptr));
   }
@@ -98,7 +99,7 @@ bool JournalReading::takeFile() {
   constexpr Turn kEnd{std::numeric_limits<std::uint64_t>::max(),
                       std::numeric_limits<std::size_t>::max()};
   const auto& limit = turns.empty() ? kEnd : turns.front();
-  auto file = files.takeBefore(limit.realtime, limit.number);
+  auto file = files.takeBefore(limit.reached, limit.number);
   if (file) {
     waitForTurn(add(std::move(*file)));
   }
@@ -113,7 +114,7 @@ JournalFileScan& JournalReading::add(JournalFile file) {
 /// Has the scan wait, or go when it has come to its end.
 void JournalReading::waitForTurn(JournalFileScan& scan) {
   if (scan.isOpen()) {
-    turns.push_back({scan.realtime(), scan.fileNumber()});
+    turns.push_back({scan.reached(), scan.fileNumber()});
     std::push_heap(turns.begin(), turns.end(), std::greater<>());
   } else {
     complete = complete && !scan.isDamaged();

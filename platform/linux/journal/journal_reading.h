@@ -14,9 +14,10 @@
 /// the reading is made, oldest first across all these files. On one thread.
 class JournalReading {
  public:
-  /// A reading of the files that it gets of `queue`, which must last longer: what it comes to
-  /// before other readings do.
-  JournalReading(JournalFileQueue& queue, const std::optional<LogFilter>& filter, LogTime from);
+  /// A reading of the files `own`, in which are all that grow, and of those of `others`, which must
+  /// last longer, that it comes to before other readings do.
+  JournalReading(std::vector<JournalFile> own, JournalFileQueue& others,
+                 const std::optional<LogFilter>& filter, LogTime from);
 
   /// Adds entries to `batch`, none at times: until it is full, or it is time to look around, or all
   /// are read. Returns false in the last case.
@@ -28,7 +29,7 @@ class JournalReading {
  private:
   /// A file waits for its turn, which comes when its next entry is the oldest.
   struct Turn {
-    std::uint64_t realtime;
+    std::uint64_t reached;
     std::size_t number;  ///< Of the file.
     bool operator>(const Turn& other) const;
   };

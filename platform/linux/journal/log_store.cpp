@@ -32,8 +32,8 @@ namespace {
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
 
-/// While the entries of one file are delivered, those of the next are read. On two cores two
-/// threads are as many as have work to do.
+/// While entries of one are delivered, the other reads on. On two cores two threads are as many as
+/// have work to do.
 constexpr std::size_t kReadingThreads = 2;
 
 /// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
@@ -136,10 +136,11 @@ unsigned long LogReader::Session::deliverAll(LogTime from) {
 /// missing.
 bool LogReader::Session::readAll(LogTime from) {
   auto files = findJournalFiles();
-  JournalFileQueue queue(std::move(files.found));
+  JournalFileQueue queue(std::move(files.found), from);
+  auto first = queue.takeFirst(kReadingThreads);
   std::list<ReadingThread> threads;
-  for (auto& pipe : pipes) {
-    threads.emplace_back(queue, filter, from, pipe);
+  for (std::size_t at = 0; at < kReadingThreads; ++at) {
+    threads.emplace_back(std::move(first.at(at)), queue, filter, from, pipes.at(at));
   }
   EntryMerge entries(pipes);
   while (!stopped && entries.next()) {

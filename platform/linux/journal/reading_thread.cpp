@@ -5,10 +5,12 @@
 #include <new>
 #include <utility>
 
-ReadingThread::ReadingThread(JournalFileQueue& files, std::optional<LogFilter> filter, LogTime from,
-                             EntryPipe& into)
+ReadingThread::ReadingThread(std::vector<JournalFile> own, JournalFileQueue& others,
+                             std::optional<LogFilter> filter, LogTime from, EntryPipe& into)
     : pipe(into),
-      thread([this, &files, filter = std::move(filter), from] { run(files, filter, from); }) {}
+      thread([this, own = std::move(own), &others, filter = std::move(filter), from]() mutable {
+        run(std::move(own), others, filter, from);
+      }) {}
 
 ReadingThread::~ReadingThread() {
   pipe.close();
@@ -22,10 +24,10 @@ bool ReadingThread::finish() {
   return complete;
 }
 
-void ReadingThread::run(JournalFileQueue& files, const std::optional<LogFilter>& filter,
-                        LogTime from) {
+void ReadingThread::run(std::vector<JournalFile> own, JournalFileQueue& others,
+                        const std::optional<LogFilter>& filter, LogTime from) {
   try {
-    JournalReading reading(files, filter, from);
+    JournalReading reading(std::move(own), others, filter, from);
     EntryBatch batch;
     bool more = true;
     while (more) {

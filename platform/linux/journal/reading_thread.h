@@ -7,15 +7,17 @@
 
 #include <optional>
 #include <thread>
+#include <vector>
 
 /// Reads journal files on a thread of its own, from which the selected entries come through a pipe,
 /// oldest first.
 class ReadingThread {
  public:
-  /// Starts to read what it gets of `files`. They and the pipe must last longer. Throws
-  /// std::system_error when there is no thread to be had.
-  ReadingThread(JournalFileQueue& files, std::optional<LogFilter> filter, LogTime from,
-                EntryPipe& into);
+  /// Starts to read the files `own`, in which are all that grow, and those of `others` that it
+  /// comes to first. These and the pipe must last longer. Throws std::system_error when there is no
+  /// thread to be had.
+  ReadingThread(std::vector<JournalFile> own, JournalFileQueue& others,
+                std::optional<LogFilter> filter, LogTime from, EntryPipe& into);
   ReadingThread(const ReadingThread&) = delete;
   ReadingThread& operator=(const ReadingThread&) = delete;
 
@@ -27,7 +29,8 @@ class ReadingThread {
   bool finish();
 
  private:
-  void run(JournalFileQueue& files, const std::optional<LogFilter>& filter, LogTime from);
+  void run(std::vector<JournalFile> own, JournalFileQueue& others,
+           const std::optional<LogFilter>& filter, LogTime from);
 
   EntryPipe& pipe;
   bool complete = false;  ///< Belongs to the thread until it has ended.
