@@ -82,7 +82,7 @@ TEST(ManagerLife, IsFollowedThroughStartsAndStops) {
   const auto successor = device.serve("manager");
   expectInTime(tool, kCollected + kPrompt);
   tool.write("quit\n");
-  EXPECT_EQ(tool.await().status, 0);
+  EXPECT_EQ(tool.finish().status, 0);
 }
 
 TEST(ManagerLife, OutlastsTheLossOfTheBus) {

@@ -6,7 +6,7 @@
 
 TestProcess startSimulator(const std::string& words, const std::string& profile) {
   const auto line = "exec \"$0\" " + words + " 3<<END\n$1\nEND";
-  return TestProcess({{"sh", "-c", line, VELL_SIMULATOR_PATH, profile}});
+  return TestProcess({"sh", "-c", line, VELL_SIMULATOR_PATH, profile});
 }
 
 SimulatedDevice::SimulatedDevice(const std::string& profile)
@@ -21,8 +21,10 @@ SimulatedDevice::~SimulatedDevice() {
   EXPECT_NO_THROW(process.finish());
 }
 
-TestProcess SimulatedDevice::start(const std::vector<std::string>& words) const {
-  return TestProcess({words, {{"VELL_SYSROOT", rootPath}, {"DBUS_SYSTEM_BUS_ADDRESS", address}}});
+TestProcess SimulatedDevice::start(std::vector<std::string> words) const {
+  words.insert(words.begin(),
+               {"VELL_SYSROOT=" + rootPath.string(), "DBUS_SYSTEM_BUS_ADDRESS=" + address});
+  return TestProcess(std::move(words));
 }
 
 ProcessResult SimulatedDevice::runLine(const std::string& line,

@@ -22,11 +22,8 @@ class SimulatedDevice {
 
   [[nodiscard]] const std::string& busAddress() const { return address; }
 
-  /// The simulator itself, whose input ends the device.
-  TestProcess& simulator() { return process; }
-
-  /// Starts a program in the device.
-  [[nodiscard]] TestProcess start(const std::vector<std::string>& words) const;
+  /// Starts `words`, as a TestProcess takes them, in the device.
+  [[nodiscard]] TestProcess start(std::vector<std::string> words) const;
 
   /// Runs `line` with the shell in the device and waits for its end: $0 is `velltool`, the other
   /// parameters are `words`.

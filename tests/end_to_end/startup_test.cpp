@@ -131,7 +131,7 @@ TEST(StartUp, ExportsItsInterfaceAndNothingElse) {
       sed -E '/^typeinfo|^_|@|^std::|^[^(]* std::/d; s/[[(].*//; s/(Command(Base|Shell)?)::.*/\1/
               s/vtable for (.*)/\1.vtable/' |
       LC_ALL=C sort -u | xargs)";
-  EXPECT_EQ(TestProcess({{"sh", "-c", line, VELLTOOL_PATH}}).finish().output,
+  EXPECT_EQ(TestProcess({"sh", "-c", line, VELLTOOL_PATH}).finish().output,
             "CommandBase CommandBase.vtable CommandShell CommandShell.vtable GetOsLogContext "
             "IsServerRunning LogdumpCommand LogdumpCommand.vtable VellCommand VellCommand.vtable "
             "VellCommandBase VellCommandBase.vtable config::build::internal_or_carrier "

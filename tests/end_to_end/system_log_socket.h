@@ -1,15 +1,16 @@
 #pragma once
 
 #include "platform/linux/file_descriptor.h"
+#include "simulator/journal_entry.h"
 
 #include <sys/socket.h>
 #include <sys/un.h>
 
 #include <cerrno>
-#include <cstdint>
-#include <cstring>
 #include <filesystem>
+#include <map>
 #include <string>
+#include <string_view>
 #include <system_error>
 #include <vector>
 
@@ -32,24 +33,18 @@ class SystemLogSocket {
   /// The MESSAGE of each entry at priority `err` that has come since the last call.
   std::vector<std::string> messages() {
     std::vector<std::string> found;
-    std::string entry(262144, '\0');
-    for (ssize_t size = 0; (size = recv(socket.get(), entry.data(), entry.size(), 0)) >= 0;) {
-      const auto whole = "\n" + entry.substr(0, static_cast<std::size_t>(size));
-      if (valueOf(whole, "\nPRIORITY\n") == "3") {
-        found.push_back(valueOf(whole, "\nMESSAGE\n"));
+    std::string datagram(262144, '\0');
+    for (ssize_t size = 0; (size = recv(socket.get(), datagram.data(), datagram.size(), 0)) >= 0;) {
+      const std::string_view entry(datagram.data(), static_cast<std::size_t>(size));
+      const auto fields = simulator::fromNativeProtocol(entry).value().fields;
+      std::map<std::string, std::string> values(fields.begin(), fields.end());
+      if (values["PRIORITY"] == "3") {
+        found.push_back(values["MESSAGE"]);
       }
     }
     return found;
   }
 
  private:
-  /// A field of an entry in the journal's native protocol, in its form with a length.
-  static std::string valueOf(const std::string& entry, const std::string& field) {
-    const auto start = entry.find(field) + field.size();
-    std::uint64_t size = 0;
-    std::memcpy(&size, entry.data() + start, sizeof size);
-    return entry.substr(start + sizeof size, size);
-  }
-
   FileDescriptor socket;
 };

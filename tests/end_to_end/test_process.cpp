@@ -29,39 +29,30 @@ FileDescriptor makePipe(FileDescriptor& testsEnd, bool processReads) {
   return FileDescriptor(ends[processReads ? 0 : 1]);
 }
 
-pid_t startChild(std::vector<std::string> words, int input, int output, int errors) {
+}  // namespace
+
+TestProcess::TestProcess(std::vector<std::string> words)
+    : errors(memfd_create("errors", MFD_CLOEXEC)) {
+  // A process that has ended must not end the test when the test writes to it.
+  std::signal(SIGPIPE, SIG_IGN);
+  words.insert(words.begin(), {"/usr/bin/env", "--default-signal=PIPE"});
   std::vector<char*> arguments(words.size() + 1);
   std::transform(words.begin(), words.end(), arguments.begin(),
                  [](std::string& word) { return word.data(); });
-  const pid_t child = fork();
-  if (child < 0) {
-    throw std::system_error(errno, std::generic_category(), "fork");
-  }
-  if (child > 0) {
-    return child;
-  }
-  prctl(PR_SET_PDEATHSIG, SIGKILL);
-  std::signal(SIGPIPE, SIG_DFL);
-  dup2(input, STDIN_FILENO);
-  dup2(output, STDOUT_FILENO);
-  dup2(errors, STDERR_FILENO);
-  execv(arguments.front(), arguments.data());
-  _exit(EXIT_FAILURE);
-}
-
-}  // namespace
-
-TestProcess::TestProcess(const ProcessStart& start) : errors(memfd_create("errors", MFD_CLOEXEC)) {
-  // A process that has ended must not end the test when the test writes to it.
-  std::signal(SIGPIPE, SIG_IGN);
-  std::vector<std::string> words = {"/usr/bin/env"};
-  for (const auto& [name, value] : start.environment) {
-    words.push_back(std::string(name).append("=").append(value));
-  }
-  words.insert(words.end(), start.words.begin(), start.words.end());
   const auto processInput = makePipe(input, true);
   const auto processOutput = makePipe(output, false);
-  process = startChild(std::move(words), processInput.get(), processOutput.get(), errors.get());
+  process = fork();
+  if (process < 0) {
+    throw std::system_error(errno, std::generic_category(), "fork");
+  }
+  if (process == 0) {
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
+    dup2(processInput.get(), STDIN_FILENO);
+    dup2(processOutput.get(), STDOUT_FILENO);
+    dup2(errors.get(), STDERR_FILENO);
+    execv(arguments.front(), arguments.data());
+    _exit(EXIT_FAILURE);
+  }
   killer = {nullptr, [started = process](void*) {
               kill(started, SIGKILL);
               waitpid(started, nullptr, 0);
@@ -98,10 +89,6 @@ void TestProcess::sendSignal(int signalNumber) const {
 
 ProcessResult TestProcess::finish() {
   input = FileDescriptor();
-  return await();
-}
-
-ProcessResult TestProcess::await() {
   while (readSome()) {
   }
   // It is reaped later, so that until then its number is no other process's.

@@ -5,17 +5,10 @@
 #include <sys/types.h>
 
 #include <filesystem>
-#include <map>
 #include <memory>
 #include <ostream>
 #include <string>
 #include <vector>
-
-/// How to start a process.
-struct ProcessStart {
-  std::vector<std::string> words;  ///< The program, looked up along PATH, and its arguments.
-  std::map<std::string, std::string> environment = {};  ///< On top of the test's own.
-};
 
 /// What a process that has ended left behind.
 struct ProcessResult {
@@ -36,8 +29,10 @@ struct ProcessResult {
 /// written. Used by one thread. Killed with the object, and also when the test program dies.
 class TestProcess {
  public:
-  /// Starts it. A program that cannot be run is a process that ends with 127.
-  explicit TestProcess(const ProcessStart& start);
+  /// Starts what env(1) makes of `words`: a program, looked up along PATH, and its arguments,
+  /// behind the NAME=VALUE that it gets on top of the test's own environment. A program that cannot
+  /// be run is a process that ends with 127.
+  explicit TestProcess(std::vector<std::string> words);
 
   /// Writes to its standard input; what it does not take, because it has ended, is dropped.
   void write(const std::string& text) const;
@@ -53,9 +48,6 @@ class TestProcess {
 
   /// Closes its input and waits for its end. The output is what no earlier call has taken.
   ProcessResult finish();
-
-  /// Waits for its end without closing its input.
-  ProcessResult await();
 
  private:
   bool readSome();

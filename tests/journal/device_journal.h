@@ -1,11 +1,10 @@
 #pragma once
 
+#include "tests/end_to_end/simulated_device.h"
 #include "tests/end_to_end/system_log_socket.h"
-#include "tests/end_to_end/test_process.h"
 
 #include <cstdint>
 #include <filesystem>
-#include <map>
 #include <string>
 #include <utility>
 #include <vector>
@@ -26,21 +25,25 @@ struct Export {
   std::vector<std::string> messages;  ///< In the system log.
 };
 
-/// A device that is nothing but a folder with journals, which go with it.
-class DeviceJournal {
+/// A history that reaches back to before everything the tests store.
+inline const std::string kAllOfHistory = "2147483647";
+
+/// What every export of it that gets as far as the reader tells the system log.
+inline const std::string kStarted = "Getting oslog stream: history = " + kAllOfHistory + ".000000";
+
+/// What it tells when something is missing.
+inline const std::string kIncomplete = "Invalid oslog stream: reason = 1";
+
+/// A simulated device whose journals the test makes.
+class DeviceJournal : public SimulatedDevice {
  public:
   DeviceJournal();
-  DeviceJournal(const DeviceJournal&) = delete;
-  DeviceJournal& operator=(const DeviceJournal&) = delete;
-  ~DeviceJournal();
-
-  [[nodiscard]] const std::filesystem::path& root() const { return folder; }
 
   /// Where the journal files are.
   [[nodiscard]] std::filesystem::path journals() const;
 
-  /// Where `run` has the export write to, unless its words say otherwise.
-  [[nodiscard]] std::filesystem::path output() const { return folder / "out.txt"; }
+  /// Where `run` has the export write to.
+  [[nodiscard]] std::filesystem::path output() const { return root() / "out.txt"; }
 
   /// Makes the journal file `name` ("system.journal") of `entries`.
   void store(const std::string& name, const std::vector<StoredEntry>& entries) const;
@@ -48,29 +51,17 @@ class DeviceJournal {
   /// Starts to store what is written to the process's input, in export format.
   [[nodiscard]] TestProcess startStoring(const std::string& name) const;
 
-  /// Exports everything stored with the words `selection`, in the time zone `zone`.
-  Export run(const std::vector<std::string>& selection = {"-p"}, const std::string& zone = "UTC0");
-
-  /// As `run`, with all the words given, and `runner` in front of them.
-  Export runWords(const std::vector<std::string>& words, const std::string& zone = "UTC0",
-                  std::vector<std::string> runner = {});
-
-  /// What starts an export.
-  [[nodiscard]] ProcessStart exporting(const std::vector<std::string>& words) const;
+  /// Exports with the words `selection`, in UTC, unless `runner`, which the shell puts before the
+  /// program and env(1) runs, has another zone.
+  Export run(const std::vector<std::string>& selection = {"-p"}, const std::string& runner = "",
+             const std::string& history = kAllOfHistory);
 
   /// The messages in the system log since they were last asked for.
   std::vector<std::string> messages() { return systemLog.messages(); }
 
  private:
-  std::filesystem::path folder;
   SystemLogSocket systemLog;
 };
-
-/// A history that reaches back to before everything the tests store.
-inline constexpr const char* kAllOfHistory = "2147483647";
-
-/// What every export that gets as far as the reader tells the system log.
-std::string startedMessage(const std::string& history = kAllOfHistory);
 
 /// How often `text` stands in `content`.
 std::size_t countOf(const std::string& text, const std::string& content);

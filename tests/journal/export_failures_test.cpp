@@ -52,12 +52,9 @@ void damage(const fs::path& path, std::size_t start, const std::string& bytes) {
   file.seekp(static_cast<std::streamoff>(start)) << bytes;
 }
 
-/// Has `words` run by somebody whom the permissions of files bind.
-std::vector<std::string> asNobody() {
-  if (geteuid() != 0) {
-    return {};
-  }
-  return {SETPRIV, "--reuid=65534", "--regid=65534", "--clear-groups"};
+/// Has a program bound by the permissions of files, as everybody is but root.
+std::string boundByPermissions() {
+  return geteuid() == 0 ? SETPRIV " --bounding-set=-all" : "";
 }
 
 // clang-format off
@@ -86,24 +83,15 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
     SCOPED_TRACE(each.what);
     DeviceJournal device;
     device.store("system.journal", entries(3));
-    fs::permissions(system(device.journals()), fs::perms(0644));
     each.prepare(device.journals());
-    // Somebody else must be able to reach the program and the folder.
-    fs::permissions(device.root(), fs::perms(0777));
-    fs::permissions(device.root() / "run/systemd/journal/socket", fs::perms(0777));
-    fs::copy_file(OSLOG_EXPORT_PATH, device.root() / "export");
-    auto start = device.exporting({kAllOfHistory, device.output()});
-    start.words[0] = device.root() / "export";
-    const auto runner = asNobody();
-    start.words.insert(start.words.begin(), runner.begin(), runner.end());
-    const auto result = TestProcess(start).finish();
+    const auto result = device.run({"-p"}, boundByPermissions());
     const bool exported = each.error.empty();
-    EXPECT_EQ(result, (ProcessResult{exported ? 0 : 1, "", ""}));
-    std::vector<std::string> messages = {startedMessage()};
+    std::vector messages = {kStarted};
     if (!exported) {
       messages = {"Could not open: " + each.error, "Failed to prepare oslog stream"};
     }
-    EXPECT_EQ(device.messages(), messages);
+    EXPECT_EQ(result.status, exported ? 0 : 1);
+    EXPECT_EQ(result.messages, messages);
     EXPECT_EQ(fs::exists(device.output()), exported);
     std::error_code ignored;
     fs::permissions(device.journals(), fs::perms(0700), ignored);
@@ -121,8 +109,7 @@ TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
   damage(file, size / 8 * 5, randomBytes(size / 8 * 3));
   const auto part = device.run();
   EXPECT_EQ(part.status, 0);
-  EXPECT_EQ(part.messages,
-            (std::vector<std::string>{startedMessage(), "Invalid oslog stream: reason = 1"}));
+  EXPECT_EQ(part.messages, (std::vector{kStarted, kIncomplete}));
   EXPECT_LT(part.content.size(), whole.content.size());
   EXPECT_EQ(part.content, whole.content.substr(0, part.content.size()));
 
@@ -181,7 +168,7 @@ TEST(ExportFailures, TellWhatTheFileIsNotFitFor) {
     DeviceJournal device;
     device.store("system.journal", entries(3));
     prepare(device.output());
-    std::vector<std::string> messages = {startedMessage()};
+    std::vector messages = {kStarted};
     if (!before.empty()) {
       messages.resize(before == created ? 0 : 1);
       messages.push_back(before + device.output().string() + after);

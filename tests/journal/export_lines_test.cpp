@@ -68,7 +68,7 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
   const auto result = device.run();
   EXPECT_EQ(result.status, 0);
   EXPECT_TRUE(result.content == lines) << result.content.substr(0, 2000);
-  EXPECT_EQ(result.messages, std::vector{startedMessage()});
+  EXPECT_EQ(result.messages, std::vector{kStarted});
 }
 
 // clang-format on
@@ -98,7 +98,7 @@ TEST(ExportLines, ShowLocalTimeAsItWasAtTheEntry) {
             [](const auto& left, const auto& right) { return left.realtime < right.realtime; });
   device.store("system.journal", entries);
   for (const auto& each : cases) {
-    const auto content = device.run({"-p"}, each.zone).content;
+    const auto content = device.run({"-p"}, "TZ=" + each.zone).content;
     EXPECT_NE(content.find(each.shown), std::string::npos) << each.zone << "\n" << content;
   }
 }
