@@ -34,8 +34,7 @@ TEST(StartUp, NeedsARadioAndADaemon) {
       {"RADIO_TYPE=1\nPROCESSES='linkward Linkwardx modemhost'", kNoDaemon},
       {"RADIO_TYPE=1\nPROCESSES=Linkward", kStarted},
       {"RADIO_TYPE=1\nPROCESSES='init modemhostd'", kStarted},
-      {"RADIO_TYPE=1\nPROCESSES=\nPRODUCT_CODE=106", kStarted},
-      {"RADIO_TYPE=1\nPROCESSES=\nPRODUCT_CODE=107", kNoDaemon}};
+      {"RADIO_TYPE=1\nPROCESSES=\nPRODUCT_CODE=106", kStarted}};
   for (const auto& [profile, expected] : cases) {
     SCOPED_TRACE(profile);
     const SimulatedDevice device(std::string("MANAGER=absent\n") + profile);

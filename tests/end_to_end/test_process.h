@@ -44,13 +44,15 @@ class TestProcess {
   /// The next line of standard output, without its newline.
   std::string readLine();
 
+  /// Waits for more standard output and keeps it for the calls that take it. False at the end.
+  bool readSome();
+
   void sendSignal(int signalNumber) const;
 
   /// Closes its input and waits for its end. The output is what no earlier call has taken.
   ProcessResult finish();
 
  private:
-  bool readSome();
   [[noreturn]] void giveUp(const std::string& awaited) const;
   [[nodiscard]] std::string writtenErrors() const;
 

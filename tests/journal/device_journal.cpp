@@ -34,12 +34,12 @@ void DeviceJournal::store(const std::string& name, const std::vector<StoredEntry
   ASSERT_EQ(result.status, 0) << result.errors;
 }
 
-Export DeviceJournal::run(const std::vector<std::string>& selection, const std::string& runner,
+Export DeviceJournal::run(const std::vector<std::string>& selection, const std::string& prelude,
                           const std::string& history) {
   std::vector<std::string> words = {history, output()};
   words.insert(words.end(), selection.begin(), selection.end());
   const auto [status, printed, errors] =
-      runLine("exec env TZ=UTC0 " + runner + " '" OSLOG_EXPORT_PATH "' \"$@\"", words);
+      runLine("export TZ=UTC0; " + prelude + " '" OSLOG_EXPORT_PATH "' \"$@\"", words);
   EXPECT_EQ(printed + errors, "");
   const bool isFile = std::filesystem::is_regular_file(output());
   return {status, isFile ? contentOf(output()) : "", messages()};

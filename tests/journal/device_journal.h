@@ -51,9 +51,9 @@ class DeviceJournal : public SimulatedDevice {
   /// Starts to store what is written to the process's input, in export format.
   [[nodiscard]] TestProcess startStoring(const std::string& name) const;
 
-  /// Exports with the words `selection`, in UTC, unless `runner`, which the shell puts before the
-  /// program and env(1) runs, has another zone.
-  Export run(const std::vector<std::string>& selection = {"-p"}, const std::string& runner = "",
+  /// Exports with the words `selection`, in UTC. `prelude` is what the shell has in front of the
+  /// program: another zone, a limit, what runs it.
+  Export run(const std::vector<std::string>& selection = {"-p"}, const std::string& prelude = "",
              const std::string& history = kAllOfHistory);
 
   /// The messages in the system log since they were last asked for.

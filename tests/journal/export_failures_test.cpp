@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <fstream>
 #include <functional>
 #include <random>
@@ -38,11 +39,8 @@ void writeFile(const fs::path& path, const std::string& content) {
 }
 
 std::string randomBytes(std::size_t count) {
-  std::mt19937 random(count);
   std::string bytes(count, '\0');
-  for (auto& byte : bytes) {
-    byte = static_cast<char>(random());
-  }
+  std::generate(bytes.begin(), bytes.end(), std::mt19937(count));
   return bytes;
 }
 
@@ -50,11 +48,6 @@ std::string randomBytes(std::size_t count) {
 void damage(const fs::path& path, std::size_t start, const std::string& bytes) {
   std::fstream file(path, std::ios::in | std::ios::out | std::ios::binary);
   file.seekp(static_cast<std::streamoff>(start)) << bytes;
-}
-
-/// Has a program bound by the permissions of files, as everybody is but root.
-std::string boundByPermissions() {
-  return geteuid() == 0 ? SETPRIV " --bounding-set=-all" : "";
 }
 
 // clang-format off
@@ -84,7 +77,8 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
     DeviceJournal device;
     device.store("system.journal", entries(3));
     each.prepare(device.journals());
-    const auto result = device.run({"-p"}, boundByPermissions());
+    // Permissions bind everybody but root, and root when it has no capabilities.
+    const auto result = device.run({"-p"}, geteuid() == 0 ? "setpriv --bounding-set=-all" : "");
     const bool exported = each.error.empty();
     std::vector messages = {kStarted};
     if (!exported) {
@@ -193,9 +187,7 @@ TEST(ExportFailures, WriteAtTheEndOfAFileThatSomebodyEmptied) {
 TEST(ExportFailures, KeepANewFileToItsOwner) {
   DeviceJournal device;
   device.store("system.journal", entries(1));
-  const auto mask = umask(0);
-  device.run();
-  umask(mask);
+  device.run({"-p"}, "umask 0;");
   EXPECT_EQ(fs::status(device.output()).permissions(), fs::perms(0600));
   // One that is there stays as open as it was.
   fs::permissions(device.output(), fs::perms(0644));

@@ -9,11 +9,7 @@
 
 namespace {
 
-/// All the bytes of a literal, NUL included.
-template <std::size_t Size>
-std::string bytes(const char (&literal)[Size]) {
-  return {literal, Size - 1};
-}
+using namespace std::string_literals;
 
 constexpr std::uint64_t kTime = 1'620'133'641'999'999;
 const std::string kShown = "2021-05-04 13:07:21 +0000 ";
@@ -50,7 +46,7 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
       {{{"MESSAGE", "empty"}, {"_EXE", ""}, {"VELL_SUBSYSTEM", ""}, {"VELL_CATEGORY", ""}},
        kShown + "0x00000 0x0 0 (): [] empty\n"},
       {{{"MESSAGE", ""}}, kNothing + "\n"},
-      {{{"MESSAGE", bytes("a\nb\n\n50%d %s \0 c")}}, kNothing + bytes("a\nb\n\n50%d %s \0 c\n")},
+      {{{"MESSAGE", "a\nb\n\n50%d %s \0 c"s}}, kNothing + "a\nb\n\n50%d %s \0 c\n"s},
       {{{"MESSAGE", longText + "end"}}, kNothing + longText + "end\n"},
       {{{"MESSAGE", "ä\x80 \xE2\x82 \xED\xA0\x80 \xF0\x9F\x93"}, {"_COMM", "p\xFF"},
         {"VELL_SENDER_IMAGE_PATH", "/\xFE/i\xC0\xAF"}, {"VELL_SUBSYSTEM", "\xC3"}, {"VELL_CATEGORY", "\xF5"}},
@@ -80,22 +76,20 @@ TEST(ExportLines, ShowLocalTimeAsItWasAtTheEntry) {
     std::uint64_t seconds;
     std::string shown;
   } cases[] = {
-      {"UTC0", 1'620'133'641, "2021-05-04 13:07:21 +0000"},
-      {"EAST-5:45", 1'620'133'641, "2021-05-04 18:52:21 +0000"},
-      {"WEST9:30", 1'620'100'000, "2021-05-03 18:16:40 +0000"},
+      {"OLD-1NEW,J60/1:07:09,J300", 1'614'556'028, "2021-03-01 00:47:08 +0000"},
       {summerTime, 1'616'893'199, "2021-03-28 01:59:59 +0000"},
       {summerTime, 1'616'893'200, "2021-03-28 03:00:00 +0000"},
+      {"WEST9:30", 1'620'100'000, "2021-05-03 18:16:40 +0000"},
+      {"UTC0", 1'620'133'641, "2021-05-04 13:07:21 +0000"},
+      {"EAST-5:45", 1'620'133'641, "2021-05-04 18:52:21 +0000"},
       {summerTime, 1'635'641'999, "2021-10-31 02:59:59 +0000"},
       {summerTime, 1'635'642'000, "2021-10-31 02:00:00 +0000"},
-      {"OLD-1NEW,J60/1:07:09,J300", 1'614'556'028, "2021-03-01 00:47:08 +0000"},
   };
   DeviceJournal device;
   std::vector<StoredEntry> entries;
   for (const auto& each : cases) {
     entries.push_back({each.seconds * 1'000'000, {{"MESSAGE", "m"}}});
   }
-  std::sort(entries.begin(), entries.end(),
-            [](const auto& left, const auto& right) { return left.realtime < right.realtime; });
   device.store("system.journal", entries);
   for (const auto& each : cases) {
     const auto content = device.run({"-p"}, "TZ=" + each.zone).content;

@@ -5,7 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <chrono>
+#include <ctime>
 #include <string>
 #include <vector>
 
@@ -63,9 +63,6 @@ TEST(ExportSelection, GoesByProcessNameAndImagePath) {
       {{"-i", "stra\u00dfe"}, "street "},
       {{"-i", "\u0391\u0345/"}, "greek "},
       {{"-i", "/b", "-p", "tool"}, "exe case hidden own told "},
-      {{"-pLinkward", "Linkward"},
-       "exe comm ident case hidden image own apart told helper street "
-       "greek none "},
       {{"-i", "no such"}, ""},
       {{"-p", "", "no such"}, ""},
   };
@@ -80,10 +77,8 @@ TEST(ExportSelection, GoesByProcessNameAndImagePath) {
 TEST(ExportSelection, GivesTheOldestFirstAcrossFiles) {
   DeviceJournal device;
   std::filesystem::create_directories(device.root() / "run/log/journal");
-  const std::string rotated =
-      "system@0123456789abcdef0123456789abcdef-0000000000000001-"
-      "0005c17f4b0a2d00.journal";
-  device.store(rotated, {message(kTime, "a"), message(kTime + 1, "b"), message(kTime + 6, "g")});
+  device.store("system@1.journal",
+               {message(kTime, "a"), message(kTime + 1, "b"), message(kTime + 6, "g")});
   device.store("system.journal",
                {message(kTime + 3, "d"), message(kTime + 4, "e"), message(kTime + 9, "i")});
   device.store("user-1000.journal",
@@ -95,8 +90,7 @@ TEST(ExportSelection, GivesTheOldestFirstAcrossFiles) {
                              device.journals() / "user-1000@copy.journal~");
   // Of another namespace, and no journal at all.
   std::filesystem::create_directories(device.journals().string() + ".other");
-  std::filesystem::copy_file(device.journals() / "user-1000.journal",
-                             device.journals().string() + ".other/system.journal");
+  device.store(device.journals().string() + ".other/system.journal", {message(kTime, "other")});
   std::filesystem::create_directories(device.journals() / "folder.journal");
   EXPECT_EQ(messagesOf(device.run().content), "a b c d e f g h i j k ");
 }
@@ -131,16 +125,13 @@ TEST(ExportSelection, SaysWhenThereAreTooManyFilesToOpen) {
         device.journals() / "system.journal",
         device.journals() / ("system@" + std::to_string(copy) + ".journal~"));
   }
-  const auto result = device.run({"-p"}, PRLIMIT " --nofile=32");
+  const auto result = device.run({"-p"}, "ulimit -n 32;");
   EXPECT_EQ(messagesOf(result.content), "one ");
   EXPECT_EQ(result.messages, (std::vector{kStarted, kIncomplete}));
 }
 
 TEST(ExportSelection, StartsAtTheHistory) {
-  const auto now =
-      static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::microseconds>(
-                                     std::chrono::system_clock::now().time_since_epoch())
-                                     .count());
+  const std::uint64_t now = std::time(nullptr) * 1'000'000ULL;
   constexpr std::uint64_t kMinute = 60'000'000;
   DeviceJournal device;
   device.store("system.journal",
