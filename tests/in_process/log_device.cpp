@@ -32,7 +32,7 @@ class DeviceFile : public WritableFile {
 class LogReader::Session {};
 
 std::unique_ptr<WritableFile> WritableFile::open(const std::string& path) {
-  return logDevice.filesCanBeOpened ? std::make_unique<DeviceFile>(path) : nullptr;
+  return std::make_unique<DeviceFile>(path);
 }
 
 void LogReader::activate(LogTime from) {
@@ -63,9 +63,7 @@ bool WorkGroup::waitFor(std::chrono::nanoseconds timeout) const {
 LogTime currentTime() { return logDevice.now; }
 void logSystemError(const std::string& message) { logDevice.messages.push_back(message); }
 void createEmptyFile(const std::string& path) { logDevice.files[path].clear(); }
-void LogStore::prepare(const Completion& completion) const {
-  completion(logDevice.source, logDevice.storeError);
-}
+void LogStore::prepare(const Completion& completion) const { completion(logDevice.source, std::nullopt); }
 LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/) {}
 LogReader::~LogReader() = default;
 void LogReader::setFlags(unsigned flags) { logDevice.flags = flags; }

@@ -18,9 +18,7 @@ namespace in_process {
 
 /// What a test sets before it exports, and reads after it has.
 struct LogDevice {
-  // The store gives the one or the other, or neither.
-  std::shared_ptr<const LogSource> source = std::make_shared<LogSource>();
-  std::optional<LogStoreError> storeError;
+  std::shared_ptr<const LogSource> source = std::make_shared<LogSource>();  ///< Of the store.
 
   // The reader.
   std::list<LogEntry> entries;                 ///< What it delivers, unfiltered, when activated.
@@ -33,8 +31,7 @@ struct LogDevice {
   LogReader::InvalidationHandler endHandler;
 
   std::map<std::string, std::string> files;  ///< Content by path.
-  bool filesCanBeOpened = true;
-  std::size_t appendsUntilFull = 1000;  ///< After these, the disk is full.
+  std::size_t appendsUntilFull = 1000;       ///< After these, the disk is full.
 
   bool groupsCanBeMade = true;
   std::chrono::nanoseconds longestWait{};  ///< The limit of the last wait that had one.

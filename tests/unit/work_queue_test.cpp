@@ -24,16 +24,6 @@ TEST(WorkQueue, RunsEverythingInOrderBeforeItsLastHandleGoes) {
   EXPECT_EQ(log, "abcd");
 }
 
-TEST(WorkQueue, ReleasesAClosureAsSoonAsItHasRun) {
-  const auto queue = WorkQueue::create("test");
-  auto token = std::make_shared<int>();
-  const std::weak_ptr<int> watch = token;
-  queue.submit([held = std::move(token)] {});
-  std::promise<bool> released;
-  queue.submit([&] { released.set_value(watch.expired()); });
-  EXPECT_TRUE(released.get_future().get());
-}
-
 TEST(WorkQueue, MayLoseItsLastHandleOnItsOwnThread) {
   std::promise<void> done;
   auto queue = std::make_shared<WorkQueue>(WorkQueue::create("test"));
