@@ -1,16 +1,15 @@
 #include "tests/journal/device_journal.h"
 
+#include "platform/clock.h"
 #include "simulator/journal.h"
 
 #include <gtest/gtest.h>
 
-#include <chrono>
-
 std::string exportFormat(const std::vector<StoredEntry>& entries) {
   std::string text;
   for (const auto& [realtime, fields] : entries) {
-    const std::chrono::microseconds time(realtime);
-    text += simulator::toExportFormat({std::chrono::sys_time(time), fields});
+    const LogTime time{std::chrono::microseconds(realtime)};
+    text += simulator::toExportFormat({time, fields});
   }
   return text;
 }

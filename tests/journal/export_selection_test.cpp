@@ -131,7 +131,7 @@ TEST(ExportSelection, SaysWhenThereAreTooManyFilesToOpen) {
 }
 
 TEST(ExportSelection, StartsAtTheHistory) {
-  const std::uint64_t now = std::time(nullptr) * 1'000'000ULL;
+  const auto now = static_cast<std::uint64_t>(std::time(nullptr)) * 1'000'000;
   constexpr std::uint64_t kMinute = 60'000'000;
   DeviceJournal device;
   device.store("system.journal",

@@ -14,7 +14,8 @@ namespace fs = std::filesystem;
 
 constexpr std::uint64_t kTime = 1'620'133'641'000'000;
 constexpr std::size_t kStored = 20000;
-const std::string kExport = "TZ=UTC0 '" OSLOG_EXPORT_PATH "' " + kAllOfHistory + " /dev/stdout ";
+const std::string kExport =
+    "TZ=UTC0 exec '" OSLOG_EXPORT_PATH "' " + kAllOfHistory + " /dev/stdout ";
 
 std::vector<StoredEntry> entries(std::size_t count, std::uint64_t start, const std::string& text) {
   std::vector<StoredEntry> made;
@@ -81,7 +82,7 @@ TEST(LiveJournal, IsReadAsFarAsItIsThereWhenItIsCutShort) {
     stored[at].fields.back().second = "/usr/bin/other";
   }
   for (const std::string selection : {"-p", "-p old"}) {
-    for (const unsigned sixteenthsLeft : {10, 0}) {
+    for (const unsigned sixteenthsLeft : {10U, 0U}) {
       SCOPED_TRACE(selection + " " + std::to_string(sixteenthsLeft));
       DeviceJournal device;
       device.store("system.journal", stored);
