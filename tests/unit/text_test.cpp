@@ -14,7 +14,7 @@ TEST(Utf8, ReplacesEachBrokenSequenceOnce) {
       {"\xE2\x82|\xE0\x80\x80|\xED\xA0\x80", "\uFFFD|\uFFFD\uFFFD\uFFFD|\uFFFD\uFFFD\uFFFD"},
       {"\xF0\x9F\x93x|\xF4\x90\x80\x80|\xF8\x88\xFF",
        "\uFFFDx|\uFFFD\uFFFD\uFFFD\uFFFD|\uFFFD\uFFFD\uFFFD"},
-      {"\xE2\x82\xE2\x82\xAC\xC3", "\uFFFD€\uFFFD"}};
+      {"\xF0\x8F\xBF\xBF|\xE2\x82\xE2\x82\xAC\xC3", "\uFFFD\uFFFD\uFFFD\uFFFD|\uFFFD€\uFFFD"}};
   for (const auto& [bytes, text] : cases) {
     EXPECT_EQ(validUtf8(bytes), text) << testing::PrintToString(bytes);
   }
