@@ -63,7 +63,9 @@ bool WorkGroup::waitFor(std::chrono::nanoseconds timeout) const {
 LogTime currentTime() { return logDevice.now; }
 void logSystemError(const std::string& message) { logDevice.messages.push_back(message); }
 void createEmptyFile(const std::string& path) { logDevice.files[path].clear(); }
-void LogStore::prepare(const Completion& completion) const { completion(logDevice.source, std::nullopt); }
+void LogStore::prepare(const Completion& completion) const {
+  completion(logDevice.source, std::nullopt);
+}
 LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/) {}
 LogReader::~LogReader() = default;
 void LogReader::setFlags(unsigned flags) { logDevice.flags = flags; }
