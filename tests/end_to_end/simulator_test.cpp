@@ -70,7 +70,7 @@ TEST(Simulator, CleansUpHoweverItEnds) {
     const auto number = std::to_string(signalNumber);
     const auto line = "kill -" + number + " $PPID; test " + number + " = 0 || exec sleep 60";
     auto simulator =
-        startSimulator("-- sh -c 'echo \"$VELL_SYSROOT\"; " + line + "'", "JOURNAL=yes");
+        startSimulator("/dev/fd/3 -- sh -c 'echo \"$VELL_SYSROOT\"; " + line + "'", "JOURNAL=yes");
     const auto root = simulator.readLine();
     EXPECT_EQ(simulator.finish(),
               (ProcessResult{signalNumber == 0 ? 0 : 128 + signalNumber, "", ""}));

@@ -33,8 +33,8 @@ bool exportAll() {
 
 /// An entry of the message "one" with everything in it, logged at 13:07:21 GMT.
 LogEntry fullEntry() {
-  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kWest,
-          0x1a2b, 0, 42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link", "calls", "one"};
+  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kWest, 0x1a2b,
+          0, 42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link", "calls", "one"};
 }
 
 TEST(OsLogStream, SetsUpTheReaderAndWritesOneLineForEachMessage) {
