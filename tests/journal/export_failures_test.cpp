@@ -138,6 +138,16 @@ TEST(ExportFailures, FindWithoutItWhatADamagedIndexHasLost) {
   }
 }
 
+TEST(ExportFailures, DoWithoutTheIndexOfAFileThatACrashLeft) {
+  DeviceJournal device;
+  storeTenths(device, "system@1.journal");
+  const auto file = device.journals() / "system@1.journal~";
+  fs::rename(device.journals() / "system@1.journal", file);
+  // How many entries have the value, which stands before its text: it was to be raised last.
+  damage(file, contentOf(file).find("SYSLOG_IDENTIFIER=tenth") - 16, std::string("\1\0\0", 3));
+  EXPECT_EQ(countOf("[tenth]", device.run({"-p", "tenth"}).content), 2000);
+}
+
 TEST(ExportFailures, TellWhatTheFileIsNotFitFor) {
   const std::string created = "Failed to create file: ";
   // clang-format off

@@ -23,7 +23,7 @@ struct LineCase {
 // clang-format off
 
 TEST(ExportLines, ShowEachFieldFromWhereItIs) {
-  const std::string longText(3 << 20, 'x');
+  const std::string longText(8 << 20, 'x');
   const LineCase cases[] = {
       {{{"MESSAGE", "all"}, {"_SOURCE_REALTIME_TIMESTAMP", "1620133640000000"}, {"TID", "6699"}, {"_PID", "42"},
         {"SYSLOG_PID", "43"}, {"VELL_ACTIVITY_ID", "1f"}, {"_EXE", "/usr/bin/linkd"}, {"_COMM", "comm"},

@@ -1,16 +1,19 @@
 // For random journals and random selections, the export is what a plain filter over all entries
 // gives: the index neither loses a line nor adds one.
 
+#include "platform/clock.h"
 #include "tests/journal/device_journal.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <chrono>
 #include <cstdlib>
 #include <iterator>
 #include <optional>
 #include <random>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace {
@@ -100,25 +103,39 @@ ModelEntry makeEntry(Chance& chance, std::uint64_t realtime, const std::string& 
   return entry;
 }
 
-/// Journals in which times are shared within a file, but not between files.
-std::vector<std::vector<ModelEntry>> makeFiles(Chance& chance) {
+struct ModelFile {
+  std::string name;
+  std::vector<ModelEntry> entries;
+};
+
+constexpr std::uint64_t kMinute = 60'000'000;
+
+/// Journals that share times, in the order of their first entries; some are written to no more.
+std::vector<ModelFile> makeFiles(Chance& chance) {
   constexpr std::uint64_t kTime = 1'620'133'641'000'000;
-  std::vector<std::vector<ModelEntry>> files(1 + chance.below(6));
+  std::vector<ModelFile> files(1 + chance.below(6));
   const std::size_t longest = chance.oneOf<std::size_t>({40, 400, 4000});
   for (std::size_t file = 0; file < files.size(); ++file) {
-    std::uint64_t time = kTime + file + files.size() * chance.below(2 * longest);
+    std::uint64_t time = kTime + kMinute * chance.below(2 * longest);
     const auto count = 1 + chance.below(longest);
     // Where many entries match it is not the index that is gone by, and that changes on the way.
     std::size_t oneIn = 1;
     for (std::size_t at = 0; at < count; ++at) {
-      time += files.size() * chance.below(4);
+      time += kMinute * chance.below(4);
       const auto number = std::to_string(file) + "." + std::to_string(at);
       oneIn = chance.below(300) == 0 ? 1 + chance.below(60) : oneIn;
-      files[file].push_back(chance.below(oneIn) == 0
-                                ? makeEntry(chance, time, number)
-                                : ModelEntry{{time, {{"MESSAGE", "#" + number}}}, number, {}, {}});
+      files[file].entries.push_back(
+          chance.below(oneIn) == 0
+              ? makeEntry(chance, time, number)
+              : ModelEntry{{time, {{"MESSAGE", "#" + number}}}, number, {}, {}});
     }
+    files[file].name =
+        (chance.below(3) == 0 ? "user-" : "system@") + std::to_string(file) + ".journal";
   }
+  std::sort(files.begin(), files.end(), [](const ModelFile& left, const ModelFile& right) {
+    return std::tie(left.entries.front().stored.realtime, left.name) <
+           std::tie(right.entries.front().stored.realtime, right.name);
+  });
   return files;
 }
 
@@ -157,12 +174,14 @@ Selection makeSelection(Chance& chance) {
   return selection;
 }
 
-std::vector<std::string> expectedNumbers(const std::vector<std::vector<ModelEntry>>& files,
-                                         const Selection& selection) {
+std::vector<std::string> expectedNumbers(const std::vector<ModelFile>& files,
+                                         const Selection& selection, std::uint64_t from) {
   std::vector<ModelEntry> selected;
   for (const auto& file : files) {
-    std::copy_if(file.begin(), file.end(), std::back_inserter(selected),
-                 [&](const auto& entry) { return selection.selects(entry); });
+    std::copy_if(file.entries.begin(), file.entries.end(), std::back_inserter(selected),
+                 [&](const ModelEntry& entry) {
+                   return entry.stored.realtime >= from && selection.selects(entry);
+                 });
   }
   std::stable_sort(selected.begin(), selected.end(), [](const auto& left, const auto& right) {
     return left.stored.realtime < right.stored.realtime;
@@ -201,18 +220,22 @@ TEST(ExportProperty, IsWhatAPlainFilterGives) {
   for (int journals = 0; journals < 6; ++journals) {
     DeviceJournal device;
     const auto files = makeFiles(chance);
-    for (std::size_t file = 0; file < files.size(); ++file) {
+    for (const auto& file : files) {
       std::vector<StoredEntry> stored;
-      std::transform(files[file].begin(), files[file].end(), std::back_inserter(stored),
+      std::transform(file.entries.begin(), file.entries.end(), std::back_inserter(stored),
                      [](const ModelEntry& entry) { return entry.stored; });
-      // Some are written to no more.
-      device.store((chance.below(3) == 0 ? "user-" : "system@") + std::to_string(file) + ".journal",
-                   stored);
+      device.store(file.name, stored);
     }
     for (int selections = 0; selections < 15; ++selections) {
       const auto selection = makeSelection(chance);
-      const auto result = device.run(selection.words());
-      ASSERT_EQ(numbersIn(result.content), expectedNumbers(files, selection))
+      // Half a minute is time enough to start an export at the same entry.
+      const auto from = chance.oneOf(chance.oneOf(files).entries).stored.realtime + kMinute / 2;
+      const auto history = currentTime().time_since_epoch() - std::chrono::microseconds(from);
+      const bool all = chance.below(2) == 0;
+      const auto result =
+          device.run(selection.words(), "",
+                     all ? kAllOfHistory : std::to_string(history / std::chrono::seconds(1)));
+      ASSERT_EQ(numbersIn(result.content), expectedNumbers(files, selection, all ? 0 : from))
           << joined(selection.words());
     }
   }
