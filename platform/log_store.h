@@ -9,9 +9,8 @@
 #include <string>
 
 /// Flags of a reader. The reader that ships reads in this one way.
-inline constexpr unsigned kLogReaderStoredOnly = 1U << 0U;  ///< Ends where the log ended.
-inline constexpr unsigned kLogReaderOldestFirst = 1U
-                                                  << 2U;  ///< From what was stored first to last.
+inline constexpr unsigned kLogReaderStoredOnly = 1U << 0U;     ///< Ends where the log ended.
+inline constexpr unsigned kLogReaderOldestFirst = 1U << 2U;    ///< In the order of being stored.
 inline constexpr unsigned kLogReaderWholeMessages = 1U << 4U;  ///< Texts are never cut off.
 
 /// Why a reader ended.
@@ -75,8 +74,8 @@ class LogReader {
   /// Starts delivering the entries that are stored when the reading starts, which is presently, and
   /// whose time is not before `from`; returns at once. To be called once. They come in the order of
   /// being stored, which an entry's own time need not follow. What is logged after that is not
-  /// delivered. When there is no thread to be had, the invalidation
-  /// handler is called at once, on the calling thread.
+  /// delivered. When there is no thread to be had, the invalidation handler is called at once, on
+  /// the calling thread.
   void activate(LogTime from);
 
   /// Stops the reader. No handler is called any more, but one call that has begun, or is about to,

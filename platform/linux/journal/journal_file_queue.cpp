@@ -9,9 +9,12 @@ JournalFileQueue::JournalFileQueue(std::vector<JournalFile> files, LogTime from)
   const auto earliest = journalTime(from);
   for (auto& file : files) {
     file.stored.first = std::max(file.stored.first, earliest);
+    if (file.stored.first > file.stored.last) {
+      continue;
+    }
     if (file.grows) {
       growing.push_back(std::move(file));
-    } else if (file.stored.first <= file.stored.last) {
+    } else {
       waiting.push_back(std::move(file));
     }
   }

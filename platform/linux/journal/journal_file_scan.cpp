@@ -56,10 +56,9 @@ JournalFileScan::JournalFileScan(JournalFile found, LogTime from)
       grows(found.grows),
       shared(found.shared),
       earliest(journalTime(from)),
-      currentRealtime(std::max(found.stored.first, earliest)),
+      currentRealtime(found.stored.first),
       latestRealtime(currentRealtime),
-      trusted(found.wasClosed),
-      open(found.stored.holds(currentRealtime)) {}
+      trusted(found.wasClosed) {}
 
 void JournalFileScan::start(const LogSelection& selection) {
   started = true;

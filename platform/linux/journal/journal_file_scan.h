@@ -15,7 +15,7 @@
 /// it passes over entries that are not selected, but not over all of them. On one thread.
 class JournalFileScan {
  public:
-  /// A walk that is not started.
+  /// A walk that is not started, through a file that has entries from then on.
   JournalFileScan(JournalFile found, LogTime from);
 
   [[nodiscard]] std::size_t fileNumber() const { return number; }
@@ -69,7 +69,7 @@ class JournalFileScan {
   bool trusted;                      ///< Whether the index can be expected to be complete.
   WayChoice way{0};
   bool indexed = false;  ///< Whether steps go by the index, or else to every entry.
-  bool open;
+  bool open = true;
   bool started = false;
   bool atEnd = false;  ///< Whether the walk is at the last entry.
   bool damaged = false;

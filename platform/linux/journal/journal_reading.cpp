@@ -26,7 +26,7 @@ JournalReading::JournalReading(std::vector<JournalFile> own, JournalFileQueue& o
     const bool grows = file.grows;
     auto& scan = add(std::move(file));
     // The end of a file that does not change can wait to be found until its turn comes.
-    if (grows && scan.isOpen()) {
+    if (grows) {
       scan.start(selection);
     }
     waitForTurn(scan);
