@@ -1,6 +1,6 @@
 #include "simulator/helper_service.h"
 
-#include "platform/linux/bus_dictionary.h"
+#include "platform/bus/bus_dictionary.h"
 #include "simulator/request_text.h"
 
 #include <cerrno>

@@ -1,6 +1,6 @@
 // The simulated device's entry point: a whole device, or one of its services alone.
 
-#include "platform/linux/sysroot.h"
+#include "platform/device/sysroot.h"
 #include "simulator/complaint.h"
 #include "simulator/device.h"
 #include "simulator/device_root.h"

@@ -1,6 +1,6 @@
 #include "simulator/manager_service.h"
 
-#include "platform/linux/bus_dictionary.h"
+#include "platform/bus/bus_dictionary.h"
 #include "platform/manager_names.h"
 #include "simulator/complaint.h"
 #include "simulator/request_text.h"

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/settings_file.h"
+#include "platform/device/settings_file.h"
 #include "platform/message_dict.h"
 
 #include <cstdint>

@@ -1,6 +1,6 @@
 #include "simulator/service.h"
 
-#include "platform/linux/bus_dictionary.h"
+#include "platform/bus/bus_dictionary.h"
 #include "simulator/collection_writer.h"
 #include "simulator/complaint.h"
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/bus_handles.h"
+#include "platform/bus/bus_handles.h"
 #include "simulator/device_model.h"
 #include "simulator/request_log.h"
 

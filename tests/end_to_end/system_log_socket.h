@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/file_descriptor.h"
+#include "platform/posix/file_descriptor.h"
 #include "simulator/journal_entry.h"
 
 #include <sys/socket.h>

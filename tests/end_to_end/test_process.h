@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/file_descriptor.h"
+#include "platform/posix/file_descriptor.h"
 
 #include <sys/types.h>
 

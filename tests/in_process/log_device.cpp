@@ -2,7 +2,7 @@
 
 #include "platform/clock.h"
 #include "platform/files.h"
-#include "platform/linux/work_group_state.h"
+#include "platform/portable/work_group_state.h"
 #include "platform/system_log.h"
 
 #include <utility>

@@ -1,4 +1,4 @@
-#include "platform/linux/journal/way_choice.h"
+#include "platform/journal/way_choice.h"
 
 #include <gtest/gtest.h>
 

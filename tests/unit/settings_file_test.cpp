@@ -1,6 +1,6 @@
-#include "platform/linux/settings_file.h"
+#include "platform/device/settings_file.h"
 
-#include "platform/linux/device_profile.h"
+#include "platform/device/device_profile.h"
 
 #include <gtest/gtest.h>
 

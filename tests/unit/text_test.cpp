@@ -1,6 +1,6 @@
 #include "platform/text.h"
 
-#include "platform/linux/utf8.h"
+#include "platform/unicode/utf8.h"
 
 #include <gtest/gtest.h>
 

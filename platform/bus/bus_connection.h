@@ -1,0 +1,118 @@
+#pragma once
+
+#include "platform/bus/bus_handles.h"
+#include "platform/posix/wake_up.h"
+
+#include <systemd/sd-bus.h>
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <list>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <thread>
+#include <vector>
+
+/// One call of a method on the bus. The texts are the caller's and outlive the connection.
+struct BusCall {
+  const char* destination = nullptr;
+  const char* path = nullptr;
+  const char* interface = nullptr;
+  const char* member = nullptr;
+  /// Appends the arguments; false when that fails. Runs on the connection's thread.
+  std::function<bool(sd_bus_message*)> fill;
+};
+
+/// How a call ended.
+enum class BusOutcome {
+  answered,  ///< With a reply that is not an error.
+  noOwner,   ///< Nobody owned the destination, or there was no bus to ask.
+  failed,    ///< In any other way.
+};
+
+/// A connection to the system bus, kept up by a thread of its own, which alone touches it.
+///
+/// The connection is made at once and, when it cannot be made or is lost, again and again until it
+/// can: at each call and a few times a second. A bus that is slow to greet is waited for once;
+/// after that it counts as no bus until it does greet. See sd_bus_open_system(3) for which bus it
+/// is.
+class BusConnection {
+ public:
+  /// Receives the end of one call, on the connection's thread. `reply` is null unless the outcome
+  /// is `answered`, and valid only during the call.
+  using ReplyHandler = std::function<void(BusOutcome outcome, sd_bus_message* reply)>;
+
+  /// What happens to the connection as a whole, told on its thread.
+  struct Hooks {
+    std::function<void(sd_bus* bus)> connected;  ///< A new connection is ready, before any call.
+    std::function<void()> lost;                  ///< It is gone; slots on it are to be released.
+  };
+
+  /// Starts to connect. `threadName` is for people; either hook may be
+  /// empty.
+  BusConnection(const std::string& threadName, Hooks hooks);
+  BusConnection(const BusConnection&) = delete;
+  BusConnection& operator=(const BusConnection&) = delete;
+
+  /// Ends the thread, with every outstanding call answered `failed`. Not on the thread itself.
+  ~BusConnection();
+
+  /// Sends a call that starts no service and has no time limit. `handler` is called exactly once,
+  /// whatever happens, and then released. From any thread.
+  void call(BusCall call, ReplyHandler handler);
+
+  /// Runs `task` on the connection's thread, after the calls and tasks handed in before. From any
+  /// thread.
+  void post(std::function<void()> task);
+
+ private:
+  using Clock = std::chrono::steady_clock;
+
+  /// A call that is to be sent as soon as the bus has greeted.
+  struct Waiting {
+    BusCall call;
+    ReplyHandler handler;
+  };
+
+  /// A call that was sent and is not answered yet.
+  struct Pending {
+    BusConnection* connection;
+    ReplyHandler handler;
+    BusSlotPtr slot;
+  };
+
+  static int onReply(sd_bus_message* reply, void* userdata, sd_bus_error* error);
+
+  void run();
+  bool runPosted();
+  void connect();
+  void process();
+  void drop();
+  void becomeReady();
+  void accept(BusCall call, ReplyHandler handler);
+  void send(const BusCall& call, ReplyHandler handler);
+  [[nodiscard]] bool sendTo(sd_bus* target, const BusCall& call, Pending& pending);
+  void finish(std::list<Pending>::iterator pending, sd_bus_message* reply);
+  [[nodiscard]] Clock::time_point wakeTime() const;
+  void wait();
+
+  const Hooks hooks;
+  WakeUp wakeUp;
+
+  // Of the connection's thread alone.
+  BusPtr bus;
+  bool ready = false;       // the bus has greeted
+  bool distrusted = false;  // the last connection was never greeted
+  Clock::time_point greetingLimit;
+  Clock::time_point nextAttempt;
+  std::vector<Waiting> waitingCalls;
+  std::list<Pending> pendingCalls;
+
+  std::mutex mutex;
+  std::vector<std::function<void()>> posted;  // guarded by mutex
+  bool stopping = false;                      // guarded by mutex
+
+  std::thread thread;
+};

@@ -1,0 +1,303 @@
+#include "platform/manager_client.h"
+
+#include "platform/bus/bus_answer.h"
+#include "platform/bus/bus_connection.h"
+#include "platform/bus/bus_dictionary.h"
+#include "platform/device/saved_traces.h"
+#include "platform/manager_names.h"
+
+#include <future>
+#include <map>
+#include <mutex>
+#include <utility>
+
+namespace {
+
+constexpr const char* kBusName = "org.vell.Manager1";
+constexpr const char* kObjectPath = "/org/vell/Manager1";
+constexpr const char* kInterface = "org.vell.Manager1";
+
+/// The state that is delivered while no manager runs.
+constexpr const char* kServerStateStopped = "Stopped";
+
+BusCall managerCall(const char* interface, const char* member,
+                    std::function<bool(sd_bus_message*)> fill) {
+  return {kBusName, kObjectPath, interface, member, std::move(fill)};
+}
+
+BusAnswer readAnswer(sd_bus_message* reply) {
+  const char* message = nullptr;
+  CommandResult result;
+  MessageDict payload;
+  if (sd_bus_message_has_signature(reply, "isv") <= 0 ||
+      sd_bus_message_read(reply, "is", &result.status, &message) <= 0 ||
+      !readPayload(reply, payload)) {
+    return failedAnswer(kStatusBusFailure, "The manager's answer has the wrong signature");
+  }
+  result.message = message;
+  return {std::move(result), std::move(payload)};
+}
+
+/// What stands in for the manager's answer while it does not run.
+BusAnswer answerWithoutManager(const std::string& command, const MessageDict& request) {
+  const auto saved = command == vell::kCommandGetTraceProperty
+                         ? savedTraceProperty(request.getString(vell::kKeyTraceName),
+                                              request.getString(vell::kKeyTracePropertyName))
+                         : std::nullopt;
+  if (!saved) {
+    return failedAnswer(vell::kStatusManagerNotRunning, "The manager is not running");
+  }
+  MessageDict reply;
+  reply.set(vell::kKeyTracePropertyValue, *saved);
+  return {CommandResult(), std::move(reply)};
+}
+
+MessageDict stateEvent(MessageDict::Value state) {
+  MessageDict payload;
+  payload.set(vell::kKeyServerState, std::move(state));
+  return payload;
+}
+
+/// The state that a reply to a property read holds.
+MessageDict::Value readState(BusOutcome outcome, sd_bus_message* reply) {
+  if (outcome == BusOutcome::noOwner) {
+    return kServerStateStopped;
+  }
+  MessageDict::Value state = MessageDict::OtherType{};
+  if (outcome == BusOutcome::answered && !readValue(reply, state)) {
+    state = MessageDict::OtherType{};
+  }
+  return state;
+}
+
+/// Who is told of events, and whether anybody is.
+class Subscriptions {
+ public:
+  explicit Subscriptions(WorkQueue deliveryQueue) : queue(std::move(deliveryQueue)) {}
+
+  void add(const std::string& eventName, vell::client::EventHandler handler) {
+    const std::lock_guard lock(mutex);
+    handlers[eventName] = std::make_shared<vell::client::EventHandler>(std::move(handler));
+  }
+
+  void switchOn() {
+    const std::lock_guard lock(mutex);
+    on = std::make_shared<Delivery>();
+  }
+
+  void switchOff() {
+    std::shared_ptr<Delivery> ended;
+    {
+      const std::lock_guard lock(mutex);
+      ended.swap(on);
+    }
+    if (ended) {
+      const std::lock_guard lock(ended->mutex);
+      ended->on = false;
+    }
+  }
+
+  bool areOn() const {
+    const std::lock_guard lock(mutex);
+    return on != nullptr;
+  }
+
+  void deliver(const std::string& eventName, MessageDict payload) const {
+    const std::lock_guard lock(mutex);
+    const auto found = handlers.find(eventName);
+    if (!on || found == handlers.end()) {
+      return;
+    }
+    // Asked again on the queue: delivery may have been switched off while the event waited there.
+    queue.submit([delivery = on, handler = found->second, event = std::move(payload)] {
+      const std::lock_guard handling(delivery->mutex);
+      if (delivery->on) {
+        (*handler)(event, WorkGroup::create());
+      }
+    });
+  }
+
+ private:
+  /// One stretch of time in which events are delivered.
+  struct Delivery {
+    std::recursive_mutex mutex;  // held while a handler runs, which may itself end the delivery
+    bool on = true;              // guarded by mutex
+  };
+
+  const WorkQueue queue;
+  mutable std::mutex mutex;
+  std::map<std::string, std::shared_ptr<const vell::client::EventHandler>>
+      handlers;                  // guarded by mutex
+  std::shared_ptr<Delivery> on;  // guarded by mutex; empty while delivery is off
+};
+
+}  // namespace
+
+class vell::client::Manager {
+ public:
+  Manager(std::string name, WorkQueue workQueue)
+      : queue(workQueue),
+        subscriptions(std::move(workQueue)),
+        clientName(std::move(name)),
+        connection("manager.client",
+                   {[this](sd_bus* bus) { onConnected(bus); }, [this] { onLost(); }}) {}
+
+  Manager(const Manager&) = delete;
+  Manager& operator=(const Manager&) = delete;
+  ~Manager() { subscriptions.switchOff(); }
+
+  void perform(const std::string& command, const MessageDict& request,
+               std::function<void(BusAnswer)> handler) {
+    connection.call(managerCall(kInterface, "PerformCommand",
+                                [command, request](sd_bus_message* message) {
+                                  return appendText(message, command) &&
+                                         appendDictionary(message, request);
+                                }),
+                    [command, request, handler = std::move(handler)](BusOutcome outcome,
+                                                                     sd_bus_message* reply) {
+                      switch (outcome) {
+                        case BusOutcome::answered:
+                          return handler(readAnswer(reply));
+                        case BusOutcome::noOwner:
+                          return handler(answerWithoutManager(command, request));
+                        case BusOutcome::failed:
+                          return handler(failedAnswer(kStatusBusFailure, "The bus failed"));
+                      }
+                    });
+  }
+
+  void switchEventsOn() {
+    subscriptions.switchOn();
+    connection.post([this] { deliverState(); });
+  }
+
+  const WorkQueue queue;
+  Subscriptions subscriptions;
+
+ private:
+  // All of these run on the connection's thread.
+
+  void onConnected(sd_bus* bus) {
+    sd_bus_slot* slot = nullptr;
+    if (sd_bus_match_signal_async(bus, &slot, kBusName, kObjectPath, kInterface, "Event", onEvent,
+                                  nullptr, this) >= 0) {
+      events.reset(slot);
+    }
+    const std::string ownerRule =
+        std::string(
+            "type='signal',sender='org.freedesktop.DBus',interface='org.freedesktop.DBus',"
+            "member='NameOwnerChanged',arg0='") +
+        kBusName + "'";
+    if (sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr, this) >= 0) {
+      ownerChanges.reset(slot);
+    }
+    greet();
+    if (stateTold) {
+      deliverState();
+    }
+  }
+
+  void onLost() {
+    events.reset();
+    ownerChanges.reset();
+    subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
+  }
+
+  void greet() {
+    connection.call(
+        managerCall(kInterface, "OpenClient",
+                    [this](sd_bus_message* message) { return appendText(message, clientName); }),
+        [](BusOutcome, sd_bus_message*) {});
+  }
+
+  /// Delivers one state event for the state that the manager has now.
+  void deliverState() {
+    if (!subscriptions.areOn()) {
+      return;
+    }
+    connection.call(
+        managerCall("org.freedesktop.DBus.Properties", "Get",
+                    [](sd_bus_message* message) {
+                      return sd_bus_message_append(message, "ss", kInterface, "ServerState") >= 0;
+                    }),
+        [this](BusOutcome outcome, sd_bus_message* reply) {
+          subscriptions.deliver(kEventServerStateChange, stateEvent(readState(outcome, reply)));
+          stateTold = true;
+        });
+  }
+
+  static int onEvent(sd_bus_message* signal, void* userdata, sd_bus_error* /*error*/) {
+    const char* name = nullptr;
+    MessageDict payload;
+    if (sd_bus_message_has_signature(signal, "sv") > 0 &&
+        sd_bus_message_read(signal, "s", &name) > 0 && readPayload(signal, payload)) {
+      static_cast<Manager*>(userdata)->subscriptions.deliver(name, std::move(payload));
+    }
+    return 0;
+  }
+
+  static int onOwnerChanged(sd_bus_message* signal, void* userdata, sd_bus_error* /*error*/) {
+    auto& manager = *static_cast<Manager*>(userdata);
+    const char* newOwner = nullptr;
+    if (sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner) <= 0) {
+      return 0;
+    }
+    if (*newOwner == '\0') {
+      manager.subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
+    } else {
+      manager.greet();
+      manager.deliverState();
+    }
+    return 0;
+  }
+
+  const std::string clientName;
+  bool stateTold = false;  // so that a new connection makes it worth telling anew
+  BusSlotPtr events;
+  BusSlotPtr ownerChanges;
+
+  // Last, so that its thread has ended before anything that it uses goes.
+  BusConnection connection;
+};
+
+std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::string& clientName,
+                                                                   WorkQueue queue) {
+  return std::make_shared<Manager>(clientName, std::move(queue));
+}
+
+void vell::client::RegisterEventHandler(std::shared_ptr<Manager> manager,
+                                        const std::string& eventName, EventHandler handler) {
+  manager->subscriptions.add(eventName, std::move(handler));
+}
+
+void vell::client::EventsOn(std::shared_ptr<Manager> manager) {
+  manager->switchEventsOn();
+}
+
+void vell::client::EventsOff(std::shared_ptr<Manager> manager) {
+  manager->subscriptions.switchOff();
+}
+
+void vell::client::PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
+                                  Completion completion, MessageDict request) {
+  manager->perform(
+      command, request,
+      [queue = manager->queue, completion = std::move(completion)](BusAnswer answer) mutable {
+        // Moved on, so that its last copy is released where it runs.
+        queue.submit([completion = std::move(completion), answer = std::move(answer)] {
+          completion(answer.first, answer.second);
+        });
+      });
+}
+
+CommandResult vell::client::PerformCommand(std::shared_ptr<Manager> manager,
+                                           const std::string& command, MessageDict request,
+                                           MessageDict* reply) {
+  const auto answered = std::make_shared<std::promise<BusAnswer>>();
+  auto answer = answered->get_future();
+  manager->perform(command, request,
+                   [answered](BusAnswer given) { answered->set_value(std::move(given)); });
+  auto [result, payload] = answer.get();
+  *reply = std::move(payload);
+  return result;
+}

@@ -1,0 +1,230 @@
+#include "platform/journal/journal_files.h"
+
+#include "platform/device/sysroot.h"
+#include "platform/journal/lost_pages.h"
+
+#include <fcntl.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <systemd/sd-id128.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <filesystem>
+#include <set>
+#include <string_view>
+#include <system_error>
+#include <utility>
+
+namespace {
+
+/// What lies in one folder, in the order of the paths; nothing when it cannot be read.
+struct Folder {
+  std::vector<std::filesystem::path> contents;
+  int error = 0;
+
+  explicit Folder(const std::filesystem::path& path) {
+    std::error_code failure;
+    std::filesystem::directory_iterator entry(path, failure);
+    for (; !failure && entry != std::filesystem::directory_iterator(); entry.increment(failure)) {
+      contents.push_back(entry->path());
+    }
+    std::sort(contents.begin(), contents.end());
+    error = failure == std::errc::no_such_file_or_directory || failure == std::errc::not_a_directory
+                ? 0
+                : failure.value();
+  }
+};
+
+/// Whether a folder of that name holds journals that are to be read.
+bool isJournalFolder(const std::string& name) {
+  sd_id128_t folder{};
+  sd_id128_t machine{};
+  if (sd_id128_from_string(name.c_str(), &folder) < 0) {
+    return false;
+  }
+  return !isLocalMachine() ||
+         (sd_id128_get_machine(&machine) >= 0 && sd_id128_equal(folder, machine) != 0);
+}
+
+/// Journal files have this ending, and a tilde after it when they were not closed in good order.
+bool isJournalFile(std::string_view name) {
+  return name.ends_with(".journal") || name.ends_with(".journal~");
+}
+
+/// A file that is rotated is written to no more, and its name tells when and where that was.
+bool isLiveFile(std::string_view name) {
+  return name.find('@') == std::string_view::npos;
+}
+
+/// When the entries of a file were stored, by its own account.
+TimeSpan spanOf(sd_journal* journal, bool grows) {
+  std::uint64_t first = 0;
+  std::uint64_t last = 0;
+  const int found = sd_journal_get_cutoff_realtime_usec(journal, &first, &last);
+  if (found == 0) {
+    return {};
+  }
+  const auto endOfTime = std::numeric_limits<std::uint64_t>::max();
+  // Where a clock was set back, the times between may be any.
+  return found < 0 || last < first ? TimeSpan{0, endOfTime}
+                                   : TimeSpan{first, grows ? endOfTime : last};
+}
+
+/// File descriptors that are held back while files are found, so that however many there are, some
+/// are left for what the process does with them.
+class HeldBackDescriptors {
+ public:
+  HeldBackDescriptors() {
+    for (auto& one : descriptors) {
+      one = FileDescriptor(open("/dev/null", O_RDONLY | O_CLOEXEC));
+    }
+  }
+
+ private:
+  std::array<FileDescriptor, 8> descriptors;
+};
+
+class Finder {
+ public:
+  explicit Finder(std::size_t most) : atMost(most) {}
+
+  /// Opens what is there and not open yet. Returns whether that was anything.
+  bool findNewFiles() {
+    const auto before = known.size();
+    for (const auto* base : {"var/log/journal", "run/log/journal"}) {
+      const Folder folder(sysroot() / base);
+      noteUnopened(folder.error);
+      findFilesOf(folder);
+      for (const auto& path : folder.contents) {
+        if (isJournalFolder(path.filename())) {
+          const Folder machine(path);
+          noteUnopened(machine.error);
+          findFilesOf(machine);
+        }
+      }
+    }
+    return known.size() > before && files.found.size() < atMost;
+  }
+
+  JournalFiles files;
+
+ private:
+  void findFilesOf(const Folder& folder) {
+    for (const auto& path : folder.contents) {
+      if (isJournalFile(path.filename().native()) && files.found.size() < atMost) {
+        findFile(path);
+      }
+    }
+  }
+
+  void findFile(const std::filesystem::path& path) {
+    FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    struct stat status {};
+    if (!file || fstat(file.get(), &status) != 0) {
+      noteUnopened(errno);
+    } else if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
+      noteFile(path.filename().native(), std::move(file), status.st_size > 0);
+    }
+  }
+
+  void noteFile(std::string_view name, FileDescriptor file, bool hasContent) {
+    if (const auto journal = openJournal(file.duplicate())) {
+      const bool grows = isLiveFile(name);
+      files.found.push_back(
+          {std::move(file), grows, !name.ends_with('~'), spanOf(journal.get(), grows), {}, 0});
+    } else {
+      note(errno);
+      // An empty file is one that is just being made.
+      files.damaged = files.damaged || hasContent;
+    }
+  }
+
+  /// What is gone was rotated away, and what is forbidden is not the user's to read; for any other
+  /// reason something is missing.
+  void noteUnopened(int error) {
+    note(error == ENOENT ? 0 : error);
+    files.damaged =
+        files.damaged || (error != 0 && error != ENOENT && error != EACCES && error != EPERM);
+  }
+
+  void note(int error) {
+    if (files.error == 0) {
+      files.error = error;
+    }
+  }
+
+  std::size_t atMost;
+  std::set<std::pair<dev_t, ino_t>> known;
+};
+
+/// Notes which times each of the files, which are in the order of their first entries, has in
+/// common with others.
+void findSharedTimes(std::vector<JournalFile>& files) {
+  for (auto file = files.begin(); file != files.end(); ++file) {
+    for (auto later = file + 1; later != files.end() && later->stored.first <= file->stored.last;
+         ++later) {
+      for (auto* shared : {&file->shared, &later->shared}) {
+        shared->first = std::min(shared->first, later->stored.first);
+        shared->last = std::max(shared->last, std::min(file->stored.last, later->stored.last));
+      }
+    }
+  }
+}
+
+/// Every journal file is open while it waits to be read, and there may be more of them than the
+/// usual limit allows, which is meant for programs that use select(2).
+void liftFileLimit() {
+  struct rlimit limit {};
+  if (getrlimit(RLIMIT_NOFILE, &limit) == 0 && limit.rlim_cur < limit.rlim_max) {
+    limit.rlim_cur = limit.rlim_max;
+    setrlimit(RLIMIT_NOFILE, &limit);
+  }
+}
+
+}  // namespace
+
+std::uint64_t journalTime(LogTime time) {
+  return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
+}
+
+JournalFiles findJournalFiles(std::size_t atMost) {
+  liftFileLimit();
+  const HeldBackDescriptors heldBack;
+  Finder finder(atMost);
+  while (finder.findNewFiles()) {
+  }
+  auto& found = finder.files.found;
+  std::stable_sort(found.begin(), found.end(),
+                   [](const JournalFile& left, const JournalFile& right) {
+                     return left.stored.first < right.stored.first;
+                   });
+  for (std::size_t number = 0; number < found.size(); ++number) {
+    found[number].number = number;
+  }
+  findSharedTimes(found);
+  return std::move(finder.files);
+}
+
+JournalPtr openJournal(FileDescriptor file) {
+  if (!file) {
+    return nullptr;
+  }
+  surviveLostPages();
+  sd_journal* opened = nullptr;
+  int number = file.get();
+  const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);
+  if (result < 0) {
+    errno = -result;
+    return nullptr;
+  }
+  file.release();
+  sd_journal_set_data_threshold(opened, 0);
+  return JournalPtr(opened);
+}
+
+bool hasJournalFile(sd_journal* journal) {
+  std::uint64_t bytes = 0;
+  return sd_journal_get_usage(journal, &bytes) >= 0 && bytes > 0;
+}

@@ -1,0 +1,89 @@
+#include "platform/unicode/utf8.h"
+
+#include <utf8proc.h>
+
+#include <cstdint>
+#include <cstring>
+
+namespace {
+
+constexpr std::string_view kReplacement = "\xEF\xBF\xBD";
+
+/// How many bytes of the ill-formed sequence that starts `bytes` make one replacement: as many as
+/// could have begun a well-formed one (the maximal subpart of the Unicode Standard, chapter 3.9).
+std::size_t brokenLength(std::string_view bytes) {
+  const auto at = [&](std::size_t index) { return static_cast<unsigned char>(bytes[index]); };
+  const unsigned lead = at(0);
+  if (lead < 0xC2 || lead > 0xF4) {
+    return 1;
+  }
+  const std::size_t whole = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
+  unsigned lowest = lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
+  unsigned highest = lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
+  std::size_t length = 1;
+  while (length < whole && length < bytes.size() && at(length) >= lowest && at(length) <= highest) {
+    ++length;
+    lowest = 0x80;
+    highest = 0xBF;
+  }
+  return length;
+}
+
+/// How many bytes at the start of `bytes` are ASCII, found a machine word at a time.
+std::size_t asciiLength(std::string_view bytes) {
+  constexpr std::uint64_t kHighBits = 0x8080808080808080;
+  std::size_t length = 0;
+  for (std::uint64_t word = 0; length + sizeof word <= bytes.size(); length += sizeof word) {
+    std::memcpy(&word, bytes.data() + length, sizeof word);
+    if ((word & kHighBits) != 0) {
+      break;
+    }
+  }
+  while (length < bytes.size() && static_cast<unsigned char>(bytes[length]) < 0x80) {
+    ++length;
+  }
+  return length;
+}
+
+/// How many bytes the code point that starts `bytes` has; 0 when it is ill-formed.
+std::size_t codePointLength(std::string_view bytes) {
+  utf8proc_int32_t codePoint = 0;
+  const auto length = utf8proc_iterate(reinterpret_cast<const utf8proc_uint8_t*>(bytes.data()),
+                                       static_cast<utf8proc_ssize_t>(bytes.size()), &codePoint);
+  return length > 0 ? static_cast<std::size_t>(length) : 0;
+}
+
+/// How many bytes at the start of `bytes` are well-formed.
+std::size_t validLength(std::string_view bytes) {
+  std::size_t length = asciiLength(bytes);
+  while (length < bytes.size()) {
+    const auto taken = codePointLength(bytes.substr(length));
+    if (taken == 0) {
+      break;
+    }
+    length += taken;
+    length += asciiLength(bytes.substr(length));
+  }
+  return length;
+}
+
+}  // namespace
+
+bool isValidUtf8(std::string_view bytes) {
+  return validLength(bytes) == bytes.size();
+}
+
+std::string validUtf8(std::string_view bytes) {
+  std::string text;
+  text.reserve(bytes.size());
+  while (!bytes.empty()) {
+    const auto valid = validLength(bytes);
+    text.append(bytes.substr(0, valid));
+    bytes.remove_prefix(valid);
+    if (!bytes.empty()) {
+      text.append(kReplacement);
+      bytes.remove_prefix(brokenLength(bytes));
+    }
+  }
+  return text;
+}
