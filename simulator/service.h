@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/bus/bus_handles.h"
+#include "platform/portable/handle.h"
 #include "simulator/device_model.h"
 #include "simulator/request_log.h"
 
@@ -9,7 +10,6 @@
 
 #include <filesystem>
 #include <list>
-#include <memory>
 #include <string>
 
 namespace simulator {
@@ -18,15 +18,8 @@ namespace simulator {
 inline constexpr int kStatusDied = 70;
 inline constexpr int kStatusRestart = 75;
 
-struct EventLoopReleaser {
-  void operator()(sd_event* loop) const { sd_event_unref(loop); }
-};
-using EventLoopPtr = std::unique_ptr<sd_event, EventLoopReleaser>;
-
-struct EventSourceReleaser {
-  void operator()(sd_event_source* source) const { sd_event_source_unref(source); }
-};
-using EventSourcePtr = std::unique_ptr<sd_event_source, EventSourceReleaser>;
+using EventLoopPtr = HandlePtr<sd_event, sd_event_unref>;
+using EventSourcePtr = HandlePtr<sd_event_source, sd_event_source_unref>;
 
 /// What the services of the device share: a connection to its bus, a loop that serves it, a log of
 /// the requests, and the giving of answers. A process has one, on its one thread.

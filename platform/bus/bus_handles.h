@@ -1,27 +1,16 @@
 #pragma once
 
+#include "platform/portable/handle.h"
+
 #include <systemd/sd-bus.h>
 
-#include <memory>
-
-/// Owners for the handles of sd-bus(3): each frees what it holds, on the thread that owns the
+/// Owners of the handles of sd-bus(3). Each is used and released on the thread that owns the
 /// connection.
 
-struct BusCloser {
-  /// Drops what is still queued: a connection is closed when nobody waits for it any more.
-  void operator()(sd_bus* bus) const { sd_bus_close_unref(bus); }
-};
-using BusPtr = std::unique_ptr<sd_bus, BusCloser>;
-
-struct BusMessageReleaser {
-  void operator()(sd_bus_message* message) const { sd_bus_message_unref(message); }
-};
-using BusMessagePtr = std::unique_ptr<sd_bus_message, BusMessageReleaser>;
-
-struct BusSlotReleaser {
-  void operator()(sd_bus_slot* slot) const { sd_bus_slot_unref(slot); }
-};
-using BusSlotPtr = std::unique_ptr<sd_bus_slot, BusSlotReleaser>;
+/// Drops what is still queued: a connection is closed when nobody waits for it any more.
+using BusPtr = HandlePtr<sd_bus, sd_bus_close_unref>;
+using BusMessagePtr = HandlePtr<sd_bus_message, sd_bus_message_unref>;
+using BusSlotPtr = HandlePtr<sd_bus_slot, sd_bus_slot_unref>;
 
 /// An error of the bus library: a place for it to be written to, freed at the end of the scope.
 class BusError {

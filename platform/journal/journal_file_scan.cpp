@@ -2,16 +2,13 @@
 
 #include "platform/journal/journal_index.h"
 #include "platform/journal/lost_pages.h"
+#include "platform/portable/handle.h"
 
 #include <algorithm>
 #include <cstdlib>
 #include <utility>
 
 namespace {
-
-struct CharactersReleaser {
-  void operator()(char* characters) const { std::free(characters); }
-};
 
 void addItem(std::string_view item, EntryBatch& batch) {
   const auto equals = item.find('=');
@@ -44,7 +41,7 @@ std::string cursorOf(sd_journal* journal) {
   if (sd_journal_get_cursor(journal, &text) < 0) {
     return {};
   }
-  const std::unique_ptr<char, CharactersReleaser> owner(text);
+  const HandlePtr<char, std::free> owner(text);
   return text;
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/clock.h"
+#include "platform/portable/handle.h"
 #include "platform/posix/file_descriptor.h"
 
 #include <systemd/sd-journal.h>
@@ -8,15 +9,10 @@
 #include <cstddef>
 #include <cstdint>
 #include <limits>
-#include <memory>
 #include <vector>
 
-struct JournalCloser {
-  void operator()(sd_journal* journal) const { sd_journal_close(journal); }
-};
-
 /// Owns an open journal. It is opened, used and closed on one thread, see sd-journal(3).
-using JournalPtr = std::unique_ptr<sd_journal, JournalCloser>;
+using JournalPtr = HandlePtr<sd_journal, sd_journal_close>;
 
 /// A point in time as the journal has it, in microseconds; it takes 0 for none.
 std::uint64_t journalTime(LogTime time);

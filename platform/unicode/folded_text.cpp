@@ -1,22 +1,19 @@
 #include "platform/unicode/folded_text.h"
 
+#include "platform/portable/handle.h"
+
 #include <utf8proc.h>
 
 #include <cstdlib>
-#include <memory>
 
 namespace {
-
-struct TextReleaser {
-  void operator()(utf8proc_uint8_t* text) const { std::free(text); }
-};
 
 std::string mapped(const std::string& text, int options) {
   utf8proc_uint8_t* result = nullptr;
   const auto length = utf8proc_map(reinterpret_cast<const utf8proc_uint8_t*>(text.data()),
                                    static_cast<utf8proc_ssize_t>(text.size()), &result,
                                    static_cast<utf8proc_option_t>(options));
-  const std::unique_ptr<utf8proc_uint8_t, TextReleaser> owner(result);
+  const HandlePtr<utf8proc_uint8_t, std::free> owner(result);
   if (length < 0) {
     return text;
   }
