@@ -54,7 +54,7 @@ void PerformCommand(std::shared_ptr<Manager> manager, const std::string& command
 
 /// Sends a command and blocks until its answer is in; otherwise as the asynchronous form. Needs no
 /// queue, so it may be called while the work queue is busy, and from the work queue. `reply`
-/// receives the reply, `MessageDict::notADictionary()` when there is none.
+/// receives the reply. After any status but 0 it is `MessageDict::notADictionary()`.
 CommandResult PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
                              MessageDict request, MessageDict* reply);
 

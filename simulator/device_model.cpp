@@ -21,7 +21,6 @@ constexpr const char* kFaultGetTraceProperty = "GET_TRACE_PROPERTY";
 constexpr const char* kFaultTraceDumpState = "TRACE_DUMP_STATE";
 constexpr const char* kFaultHelper = "HELPER_ANSWER";
 
-constexpr std::int32_t kStatusUnknownCommand = static_cast<std::int32_t>(0xE020E002U);
 constexpr std::int32_t kStatusBadRequest = static_cast<std::int32_t>(0xE020E003U);
 
 constexpr std::int64_t kAlderVendor = 2;
@@ -203,12 +202,12 @@ Answer DeviceModel::performCommand(const std::string& command, const MessageDict
   if (command == vell::kCommandTraceDumpState) {
     return dumpTraces(request);
   }
-  return makeFailure(kStatusUnknownCommand, "unknown command " + command);
+  return makeFailure(kStatusBadRequest, "unknown command " + command);
 }
 
 Answer DeviceModel::performHelperCommand(const std::string& command) const {
   if (command != vell::helper::kCommandTidewellStatus) {
-    return makeFailure(kStatusUnknownCommand, "unknown command " + command);
+    return makeFailure(kStatusBadRequest, "unknown command " + command);
   }
   Answer answer;
   helperTimestamp.putInto(answer.reply, vell::helper::kKeyTimestampString, presentTime());

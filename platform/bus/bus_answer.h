@@ -3,16 +3,28 @@
 #include "platform/command_result.h"
 #include "platform/message_dict.h"
 
+#include <systemd/sd-bus.h>
+
 #include <cstdint>
-#include <utility>
 
-/// What a command on the bus is answered with.
-using BusAnswer = std::pair<CommandResult, MessageDict>;
+/// The answer to a command on the bus.
+struct BusAnswer {
+  CommandResult result;
+  MessageDict reply;  ///< `notADictionary()` unless the command succeeded.
+};
 
-/// The status of a command that the bus failed, other than by finding nobody to ask.
+/// Status of a command that the bus failed in any way but a missing owner.
 inline constexpr std::int32_t kStatusBusFailure = static_cast<std::int32_t>(0xE020E002U);
 
 /// The answer to a command that was not carried out.
-inline BusAnswer failedAnswer(std::int32_t status, const char* message) {
-  return {{status, message}, MessageDict::notADictionary()};
-}
+BusAnswer failedAnswer(std::int32_t status, const char* message);
+
+/// Which members the answers of a service have.
+enum class AnswerForm {
+  statusReply,         ///< Signature `iv`.
+  statusMessageReply,  ///< Signature `isv`.
+};
+
+/// Reads an answer. A `message` with another signature is a failure of the bus. On the thread that
+/// owns the message.
+BusAnswer readAnswer(sd_bus_message* message, AnswerForm form);

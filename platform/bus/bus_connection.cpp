@@ -57,7 +57,7 @@ BusConnection::~BusConnection() {
 
 void BusConnection::call(BusCall call, ReplyHandler handler) {
   post([this, call = std::move(call), handler = std::move(handler)]() mutable {
-    accept(std::move(call), std::move(handler));
+    startCall(std::move(call), std::move(handler));
   });
 }
 
@@ -163,7 +163,7 @@ void BusConnection::drop() {
 }
 
 /// Sends a call now, or once the bus has greeted, or answers it when there is no bus.
-void BusConnection::accept(BusCall call, ReplyHandler handler) {
+void BusConnection::startCall(BusCall call, ReplyHandler handler) {
   if (!bus && thread.joinable()) {
     connect();
   }

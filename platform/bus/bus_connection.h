@@ -91,7 +91,7 @@ class BusConnection {
   void process();
   void drop();
   void becomeReady();
-  void accept(BusCall call, ReplyHandler handler);
+  void startCall(BusCall call, ReplyHandler handler);
   void send(const BusCall& call, ReplyHandler handler);
   [[nodiscard]] bool sendTo(sd_bus* target, const BusCall& call, Pending& pending);
   void finish(std::list<Pending>::iterator pending, sd_bus_message* reply);

@@ -18,26 +18,10 @@ constexpr const char* kBusName = "org.vell.Helper1";
 constexpr const char* kObjectPath = "/org/vell/Helper1";
 constexpr const char* kInterface = "org.vell.Helper1";
 
-/// So far ahead that no wait reaches it, and no addition to the present time overflows.
+/// Longest time limit, in milliseconds. Added to the present time it does not overflow.
 constexpr std::int64_t kLongestWait = std::int64_t{1000} * 60 * 60 * 24 * 365;
 
-BusAnswer readAnswer(BusOutcome outcome, sd_bus_message* reply) {
-  if (outcome != BusOutcome::answered) {
-    return failedAnswer(kStatusBusFailure, "The helper did not answer");
-  }
-  BusAnswer answer;
-  if (sd_bus_message_has_signature(reply, "iv") <= 0 ||
-      sd_bus_message_read(reply, "i", &answer.first.status) <= 0 ||
-      !readPayload(reply, answer.second)) {
-    return failedAnswer(kStatusBusFailure, "The helper's answer has the wrong signature");
-  }
-  if (answer.first.status != 0) {
-    answer.second = MessageDict::notADictionary();
-  }
-  return answer;
-}
-
-/// How long the request says to wait.
+/// Time limit that the request names.
 std::chrono::milliseconds patienceOf(const MessageDict& request) {
   const auto& entries = request.entries();
   const auto found = std::find_if(entries.begin(), entries.end(), [](const auto& entry) {
@@ -57,14 +41,17 @@ class vell::HelperClient::Connection {
   std::future<BusAnswer> perform(helper::TaskID task, const char* command,
                                  const MessageDict& request) {
     const auto promise = std::make_shared<std::promise<BusAnswer>>();
-    bus.call({kBusName, kObjectPath, kInterface, "Perform",
-              [task, command = std::string(command), request](sd_bus_message* message) {
-                return sd_bus_message_append(message, "u", task) >= 0 &&
-                       appendText(message, command) && appendDictionary(message, request);
-              }},
-             [promise](BusOutcome outcome, sd_bus_message* reply) {
-               promise->set_value(readAnswer(outcome, reply));
-             });
+    bus.call(
+        {kBusName, kObjectPath, kInterface, "Perform",
+         [task, command = std::string(command), request](sd_bus_message* message) {
+           return sd_bus_message_append(message, "u", task) >= 0 && appendText(message, command) &&
+                  appendDictionary(message, request);
+         }},
+        [promise](BusOutcome outcome, sd_bus_message* reply) {
+          promise->set_value(outcome == BusOutcome::answered
+                                 ? readAnswer(reply, AnswerForm::statusReply)
+                                 : failedAnswer(kStatusBusFailure, "The helper did not answer"));
+        });
     return promise->get_future();
   }
 
@@ -90,7 +77,7 @@ CommandResult vell::HelperClient::perform(helper::TaskID task, const char* comma
     reply = MessageDict::notADictionary();
     return {kStatusBusFailure, "The helper did not answer in time"};
   }
-  auto [result, payload] = answered.get();
-  reply = std::move(payload);
-  return result;
+  auto answer = answered.get();
+  reply = std::move(answer.reply);
+  return answer.result;
 }

@@ -25,20 +25,7 @@ BusCall managerCall(const char* interface, const char* member,
   return {kBusName, kObjectPath, interface, member, std::move(fill)};
 }
 
-BusAnswer readAnswer(sd_bus_message* reply) {
-  const char* message = nullptr;
-  CommandResult result;
-  MessageDict payload;
-  if (sd_bus_message_has_signature(reply, "isv") <= 0 ||
-      sd_bus_message_read(reply, "is", &result.status, &message) <= 0 ||
-      !readPayload(reply, payload)) {
-    return failedAnswer(kStatusBusFailure, "The manager's answer has the wrong signature");
-  }
-  result.message = message;
-  return {std::move(result), std::move(payload)};
-}
-
-/// What stands in for the manager's answer while it does not run.
+/// Answers a command while no manager runs: from the saved traces where they can.
 BusAnswer answerWithoutManager(const std::string& command, const MessageDict& request) {
   const auto saved = command == vell::kCommandGetTraceProperty
                          ? savedTraceProperty(request.getString(vell::kKeyTraceName),
@@ -58,7 +45,7 @@ MessageDict stateEvent(MessageDict::Value state) {
   return payload;
 }
 
-/// The state that a reply to a property read holds.
+/// State in the reply to a read of the property.
 MessageDict::Value readState(BusOutcome outcome, sd_bus_message* reply) {
   if (outcome == BusOutcome::noOwner) {
     return kServerStateStopped;
@@ -70,7 +57,7 @@ MessageDict::Value readState(BusOutcome outcome, sd_bus_message* reply) {
   return state;
 }
 
-/// Who is told of events, and whether anybody is.
+/// The event handlers, and whether events are delivered to them.
 class Subscriptions {
  public:
   explicit Subscriptions(WorkQueue deliveryQueue) : queue(std::move(deliveryQueue)) {}
@@ -118,7 +105,7 @@ class Subscriptions {
   }
 
  private:
-  /// One stretch of time in which events are delivered.
+  /// Lives from one EventsOn to the next EventsOff or EventsOn.
   struct Delivery {
     std::recursive_mutex mutex;  // held while a handler runs, which may itself end the delivery
     bool on = true;              // guarded by mutex
@@ -157,7 +144,7 @@ class vell::client::Manager {
                                                                      sd_bus_message* reply) {
                       switch (outcome) {
                         case BusOutcome::answered:
-                          return handler(readAnswer(reply));
+                          return handler(readAnswer(reply, AnswerForm::statusMessageReply));
                         case BusOutcome::noOwner:
                           return handler(answerWithoutManager(command, request));
                         case BusOutcome::failed:
@@ -191,7 +178,7 @@ class vell::client::Manager {
     if (sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr, this) >= 0) {
       ownerChanges.reset(slot);
     }
-    greet();
+    openClient();
     if (stateTold) {
       deliverState();
     }
@@ -203,7 +190,7 @@ class vell::client::Manager {
     subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
   }
 
-  void greet() {
+  void openClient() {
     connection.call(
         managerCall(kInterface, "OpenClient",
                     [this](sd_bus_message* message) { return appendText(message, clientName); }),
@@ -245,7 +232,7 @@ class vell::client::Manager {
     if (*newOwner == '\0') {
       manager.subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
     } else {
-      manager.greet();
+      manager.openClient();
       manager.deliverState();
     }
     return 0;
@@ -285,7 +272,7 @@ void vell::client::PerformCommand(std::shared_ptr<Manager> manager, const std::s
       [queue = manager->queue, completion = std::move(completion)](BusAnswer answer) mutable {
         // Moved on, so that its last copy is released where it runs.
         queue.submit([completion = std::move(completion), answer = std::move(answer)] {
-          completion(answer.first, answer.second);
+          completion(answer.result, answer.reply);
         });
       });
 }
@@ -297,7 +284,7 @@ CommandResult vell::client::PerformCommand(std::shared_ptr<Manager> manager,
   auto answer = answered->get_future();
   manager->perform(command, request,
                    [answered](BusAnswer given) { answered->set_value(std::move(given)); });
-  auto [result, payload] = answer.get();
-  *reply = std::move(payload);
-  return result;
+  auto given = answer.get();
+  *reply = std::move(given.reply);
+  return given.result;
 }
