@@ -13,6 +13,7 @@
 #include "platform/telephony.h"
 #include "tool/config.h"
 
+#include <cstdint>
 #include <iostream>
 #include <list>
 #include <string>
@@ -21,7 +22,7 @@ namespace {
 
 constexpr const char* kHelperClientName = "logdump.helper";
 
-/// The helper's task that has to do with the system's diagnostic collections.
+/// The helper's task for the system's diagnostic collections.
 constexpr vell::helper::TaskID kDiagnosticsTask = 4;
 
 constexpr std::int64_t kHelperTimeoutMilliseconds = 1500;
@@ -30,10 +31,10 @@ void printFailure() {
   std::cout << "Baseband log collection: Failed" << std::endl;
 }
 
-/// A property of the baseband trace, as the manager tells it.
+/// The manager's answer to a query for a property of the baseband trace.
 struct FlagAnswer {
-  bool asked = false;     ///< The query itself succeeded.
-  bool readable = false;  ///< What came back was a dictionary.
+  bool answered = false;  ///< The query succeeded.
+  bool readable = false;  ///< The reply is a dictionary.
   bool flag = false;      ///< The property's value; off when it is missing or not understood.
 };
 
@@ -42,64 +43,52 @@ FlagAnswer askTraceFlag(const LogdumpCommand& node, MessageDict& request, const 
   MessageDict reply;
   const auto result =
       vell::client::PerformCommand(node.manager, vell::kCommandGetTraceProperty, request, &reply);
+  // A command that failed leaves no dictionary, and so the flag off.
   FlagAnswer answer{result.status == 0, reply.isDictionary(), false};
-  if (answer.asked && answer.readable) {
-    parseTraceFlag(reply.getString(vell::kKeyTracePropertyValue, vell::kUnknown), answer.flag);
-  }
+  parseTraceFlag(reply.getString(vell::kKeyTracePropertyValue, vell::kUnknown), answer.flag);
   return answer;
 }
 
-/// How the collection is to be packed: not at all where the device or the trace mode forbids it.
+/// `wanted`, or no compression where the device or the trace mode forbids it.
 CompressionMode allowedMode(LogdumpCommand& node, CompressionMode wanted) {
   const bool packed = !isSystemLogsTraceModeThree(node) && compressionSupported();
   return packed ? wanted : kCompressionNone;
 }
 
-/// The timestamp of the collection that the helper knows of; empty when it does not say.
+/// The timestamp of the helper's collection; empty when the helper does not say.
 std::string askHelperForTimestamp() {
   const auto helper = vell::HelperClient::create(kHelperClientName, nullptr);
   MessageDict request;
   request.set(vell::helper::kKeyTimeout, kHelperTimeoutMilliseconds);
   MessageDict reply;
-  const auto result =
-      helper->perform(kDiagnosticsTask, vell::helper::kCommandTidewellStatus, request, reply);
-  return result.status == 0 ? reply.getString(vell::helper::kKeyTimestampString) : "";
+  // The result need not be examined: a command that failed leaves no dictionary.
+  helper->perform(kDiagnosticsTask, vell::helper::kCommandTidewellStatus, request, reply);
+  return reply.getString(vell::helper::kKeyTimestampString);
 }
 
-void printCollected(const MessageDict& reply, CompressionMode mode, bool highThroughput) {
-  const auto timestamp = reply.getString(vell::kKeyTimestampString);
-  std::cout << "Baseband log collection: Success (Vell running)" << std::endl;
-  std::cout << "Path = "
-            << buildLogPath(timestamp, mode, vell::trace::getBasebandTraceDirSuffix(highThroughput))
-            << std::endl;
+void printSuccess(const char* managerState, const std::string& path) {
+  std::cout << "Baseband log collection: Success (Vell " << managerState << ")" << std::endl;
+  std::cout << "Path = " << path << std::endl;
 }
 
-/// Prints where the traces lie that a manager which does not run has left behind.
-void printLeftBehind(bool highThroughput) {
+/// Where a manager that no longer runs left its traces.
+std::string leftBehindPath(bool highThroughput) {
   const auto timestamp =
       config::build::internal_or_carrier() ? askHelperForTimestamp() : std::string();
-  std::cout << "Baseband log collection: Success (Vell not running)" << std::endl;
   if (!timestamp.empty()) {
-    std::cout << "Path = "
-              << buildLogPath(timestamp, kCompressionNone,
-                              vell::trace::getBasebandTraceDirSuffix(highThroughput))
-              << std::endl;
-    return;
+    return buildLogPath(timestamp, kCompressionNone,
+                        vell::trace::getBasebandTraceDirSuffix(highThroughput));
   }
-  std::cout << "Path = " << vell::trace::kScratchFolder
-            << (highThroughput ? diag::config::kQDSSScratchDir : diag::config::kDIAGScratchDir)
-            << std::endl;
+  const std::string folder = vell::trace::kScratchFolder;
+  return folder + (highThroughput ? diag::config::kQDSSScratchDir : diag::config::kDIAGScratchDir);
 }
 
-void dumpTrace(LogdumpCommand& node, std::list<std::string> args, bool highThroughput) {
-  auto mode = defaultCompressionMode();
-  std::string reason;
-  bool nonui = false;  // accepted for the sake of the other handlers, and of no effect here
-  parseLogdumpArgs(args, mode, reason, nonui);
-  mode = allowedMode(node, mode);
-
+void dumpTrace(LogdumpCommand& node, const std::list<std::string>& args, bool highThroughput) {
+  // "nonui" is accepted and has no effect here.
+  const auto options = readLogdumpOptions(args);
+  const auto mode = allowedMode(node, options.mode);
   MessageDict request;
-  request.set(vell::kKeyTraceDumpStateReason, reason);
+  request.set(vell::kKeyTraceDumpStateReason, options.reason);
   request.set(vell::kKeyTraceAction, vell::kCollectBasebandLogs);
   request.set(vell::kKeyTraceDumpStatePerformCompression, mode);
   MessageDict reply;
@@ -107,9 +96,11 @@ void dumpTrace(LogdumpCommand& node, std::list<std::string> args, bool highThrou
       vell::client::PerformCommand(node.manager, vell::kCommandTraceDumpState, request, &reply);
   switch (result.status) {
     case 0:
-      return printCollected(reply, mode, highThroughput);
+      return printSuccess("running",
+                          buildLogPath(reply.getString(vell::kKeyTimestampString), mode,
+                                       vell::trace::getBasebandTraceDirSuffix(highThroughput)));
     case vell::kStatusManagerNotRunning:
-      return printLeftBehind(highThroughput);
+      return printSuccess("not running", leftBehindPath(highThroughput));
     default:
       return printFailure();
   }
@@ -119,7 +110,7 @@ bool collect(LogdumpCommand& node, const std::list<std::string>& args) {
   MessageDict request;
   request.set(vell::kKeyTraceName, vell::kTraceBaseband);
   const auto enabled = askTraceFlag(node, request, vell::kKeyTraceEnabled);
-  if (!enabled.asked || !enabled.readable) {
+  if (!enabled.readable) {
     printFailure();
   } else if (!enabled.flag) {
     std::cout << "Baseband logs are not enabled" << std::endl;
@@ -128,7 +119,7 @@ bool collect(LogdumpCommand& node, const std::list<std::string>& args) {
         radioDiagSupportsQdss() && askTraceFlag(node, request, vell::kKeyTraceHighTput).flag;
     dumpTrace(node, args, highThroughput);
   }
-  return enabled.asked;
+  return enabled.answered;
 }
 
 }  // namespace

@@ -31,3 +31,10 @@ void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::
     }
   }
 }
+
+LogdumpOptions readLogdumpOptions(std::list<std::string> args) {
+  LogdumpOptions options;
+  options.mode = defaultCompressionMode();
+  parseLogdumpArgs(args, options.mode, options.reason, options.nonui);
+  return options;
+}

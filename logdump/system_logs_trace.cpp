@@ -39,7 +39,7 @@ bool isSystemLogsTraceModeThree(LogdumpCommand& node) {
   request.set(vell::kKeyTraceName, vell::kTraceSystemLogs);
   request.set(vell::kKeyTracePropertyName, vell::kKeyTraceMode);
   MessageDict reply;
-  // The result is left alone: a command that failed leaves nothing in the reply to go by.
+  // The result need not be examined: a command that failed leaves no dictionary.
   vell::client::PerformCommand(node.manager, vell::kCommandGetTraceProperty, request, &reply);
   return parseTraceMode(reply.getString(vell::kKeyTracePropertyValue)) == kModeThree;
 }

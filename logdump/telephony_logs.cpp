@@ -15,25 +15,12 @@
 
 namespace {
 
-/// What the user asked for.
-struct CollectionOptions {
-  CompressionMode mode = defaultCompressionMode();
-  std::string reason;
-  bool nonui = false;
-};
-
-CollectionOptions readOptions(std::list<std::string> args) {
-  CollectionOptions options;
-  parseLogdumpArgs(args, options.mode, options.reason, options.nonui);
-  return options;
-}
-
-/// Stands for each of the directories that a collection of telephony logs consists of.
+/// Stands for every directory of a collection of telephony logs.
 std::string everyDirectorySuffix() {
   return "-*";
 }
 
-/// How one kind of collection reports its end.
+/// How a kind of collection prints its outcome.
 struct Report {
   const char* title;
   std::string (*directorySuffix)();
@@ -53,8 +40,8 @@ void printOutcome(const Report& report, CompressionMode mode, const CommandResul
   std::cout << "Path = " << buildLogPath(timestamp, mode, report.directorySuffix()) << std::endl;
 }
 
-/// Puts in what every collection's request ends with.
-void setPackingAndConsent(MessageDict& request, const CollectionOptions& options) {
+/// Appends the keys that every collection's request ends with.
+void setPackingAndConsent(MessageDict& request, const LogdumpOptions& options) {
   request.set(vell::kKeyTraceDumpStatePerformCompression, options.mode);
   if (options.nonui) {
     request.set(vell::kKeyTraceUserConfirmation, false);
@@ -76,7 +63,7 @@ void requestCollection(const LogdumpCommand& node, const WorkGroup& group, const
 
 CommandHandler makeTelephonyLogsHandler(LogdumpCommand& node) {
   return [&node](const WorkGroup& group, const std::list<std::string>& args) {
-    auto options = readOptions(args);
+    auto options = readLogdumpOptions(args);
     if (isSystemLogsTraceModeThree(node)) {
       options.mode = kCompressionNone;
     }
@@ -91,7 +78,7 @@ CommandHandler makeTelephonyLogsHandler(LogdumpCommand& node) {
 
 CommandHandler makeCoreDumpHandler(LogdumpCommand& node) {
   return [&node](const WorkGroup& group, const std::list<std::string>& args) {
-    const auto options = readOptions(args);
+    const auto options = readLogdumpOptions(args);
     MessageDict request;
     request.set(vell::kKeyBasebandResetType, vell::kBasebandResetTypeHard);
     request.set(vell::kKeyBasebandResetSubType, vell::kBasebandResetSubTypeOtherErrors);

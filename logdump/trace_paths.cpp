@@ -55,10 +55,8 @@ std::string vell::trace::getBasebandTraceDirSuffix(bool qdss) {
 }
 
 std::string vell::trace::getCoreDumpDirSuffix() {
-  // Never destroyed: a completion may still read it on another thread while the process exits.
-  static const auto& suffix =
-      *new std::string(isAlderRadio() ? kAlderCoreDumpSnapshotDirectorySuffix
-                                      : kBirchCoreDumpSnapshotDirectorySuffix);
+  static const std::string suffix = isAlderRadio() ? kAlderCoreDumpSnapshotDirectorySuffix
+                                                   : kBirchCoreDumpSnapshotDirectorySuffix;
   return suffix;
 }
 

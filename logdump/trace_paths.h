@@ -4,7 +4,7 @@
 
 #include <string>
 
-/// Where the manager keeps its traces and its collections, and how it names them.
+/// Folders and names of the manager's traces and collections.
 namespace vell::trace {
 
 extern const char* const kSnapshotFolder;     ///< Folder of the collections.
@@ -19,12 +19,12 @@ extern const char* const kBirchQDSSTraceSnapshotDirectorySuffix;
 extern const char* const kAlderCoreDumpSnapshotDirectorySuffix;
 extern const char* const kBirchCoreDumpSnapshotDirectorySuffix;
 
-/// The suffix of a baseband trace's directory, by the family of the device's radio; `qdss` tells
-/// whether it is the QDSS trace. From any thread.
+/// The suffix of a baseband trace's directory, by the family of the device's radio. `qdss`: it is
+/// the QDSS trace. From any thread.
 std::string getBasebandTraceDirSuffix(bool qdss);
 
-/// The suffix of a core dump's directory, by the family of the device's radio, which is asked for
-/// once in the life of the process. From any thread, also while the process exits.
+/// The suffix of a core dump's directory, by the family of the device's radio. The radio is asked
+/// for on the first call only. From any thread.
 std::string getCoreDumpDirSuffix();
 
 }  // namespace vell::trace
@@ -36,6 +36,7 @@ extern const char* const kQDSSScratchDir;  ///< The live QDSS trace, below the s
 
 }  // namespace diag::config
 
-/// The path of a collection: the snapshot folder, the prefix, `timestamp`, and a point with the
-/// extension that `mode` packs with, or `suffix` when it does not pack. From any thread.
+/// The path of a collection: the snapshot folder, the prefix, `timestamp`, and the ending. The
+/// ending is a point and the extension of `mode`, or `suffix` when `mode` does not pack. From any
+/// thread.
 std::string buildLogPath(std::string timestamp, CompressionMode mode, std::string suffix);
