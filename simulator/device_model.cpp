@@ -140,7 +140,10 @@ Answer makeFailure(std::int32_t status, const std::string& message) {
 /// `answer` with what `plan` makes of it. Only what is replied to has been collected.
 Answer withFaults(Answer answer, const FaultPlan& plan) {
   if (plan.status != 0) {
-    answer = makeFailure(plan.status, "failed as the profile says");
+    // The reply stays: nobody is to go by the reply of a command that failed.
+    answer.status = plan.status;
+    answer.message = "failed as the profile says";
+    answer.collection.reset();
   }
   if (plan.noDictionary) {
     answer.reply = MessageDict::notADictionary();

@@ -109,8 +109,12 @@ TEST(ManagerLife, IsNotWaitedForOnABusThatLeadsNowhereOrNeverGreets) {
   for (const auto& address : {std::string(), std::string("nonsense"), device.busAddress(),
                               std::string("tcp:host=127.0.0.1,port=1")}) {
     SCOPED_TRACE(address);
-    const auto* line = "DBUS_SYSTEM_BUS_ADDRESS=$1 exec \"$0\" logdump bb -- logdump tel";
-    EXPECT_EQ(device.runLine(line, {address}), (ProcessResult{1, kScratch, kRefusal}));
+    const auto* line =
+        "DBUS_SYSTEM_BUS_ADDRESS=$1 exec \"$0\" logdump bb -- logdump bb -- logdump tel";
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(device.runLine(line, {address}), (ProcessResult{1, kScratch + kScratch, kRefusal}));
+    // The greeting is waited for by one request for 5 seconds, by no other.
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(13));
   }
 }
 
