@@ -44,10 +44,9 @@ bool CommandShell::run(std::list<std::string> words) {
 
 bool CommandShell::readInteractively() {
   while (true) {
-    // The read flushes the prompt: standard input is tied to standard output.
-    std::cout << "(" << promptNode->getHierarchy() << ")>> ";
+    std::cout << "(" << promptNode->getHierarchy() << ")>> " << std::flush;
     std::string line;
-    if (!std::getline(std::cin, line)) {
+    if (!std::cout || !std::getline(std::cin, line)) {
       return false;
     }
     if (executeGroups(splitCommandGroups(splitAtWhiteSpace(line))) == GroupEnd::leave) {
@@ -83,6 +82,10 @@ CommandShell::GroupEnd CommandShell::executeGroups(
     currentNode = promptNode ? promptNode : rootNode;
     if (end != GroupEnd::succeeded) {
       return end;
+    }
+    // Nobody has seen what it did, nor would see what the next one does.
+    if (!std::cout) {
+      return GroupEnd::failed;
     }
   }
   return GroupEnd::succeeded;

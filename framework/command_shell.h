@@ -24,7 +24,8 @@ class CommandShell {
   /// Runs the command line `words`, the program's name first. With more words than that they are
   /// executed as commands separated by "--", up to the first that fails; the result tells whether
   /// none did. Otherwise reads commands from standard input with a prompt on standard output; the
-  /// result tells whether the user left with "quit" or "exit". False when there is no tree.
+  /// result tells whether the user left with "quit" or "exit". False when there is no tree, and
+  /// when standard output fails: nothing more is executed then.
   bool run(std::list<std::string> words);
 
  private:

@@ -6,8 +6,11 @@
 const char* getprogname();
 
 /// Opens the null device in place of each standard stream that the process was started without, so
-/// that nothing else comes to stand there; see null(4). Called first of all, on the main thread.
-void openMissingStandardStreams();
+/// that nothing else comes to stand there; see null(4). Has std::cout and std::cerr wait for room
+/// where they lead to a pipe or terminal that does not block, so that they fail only when what is
+/// behind them cannot be written to; each is then for one thread at a time. Called first of all, on
+/// the main thread.
+void prepareStandardStreams();
 
 /// Keeps the calling thread, which is the main thread, in service of the platform for the rest of
 /// the process's life. Does not return.

@@ -31,13 +31,16 @@ void* runShellThread(void* argument) {
   // Never destroyed: the process ends with the tree and the client alive.
   const std::shared_ptr<VellShell> shell(new VellShell);
   const bool result = shell->run(words);
+  if (!std::cout) {
+    std::cerr << "velltool: cannot write to standard output" << std::endl;
+  }
   std::exit(result ? EXIT_SUCCESS : EXIT_FAILURE);
 }
 
 }  // namespace
 
 int main(int count, char* vector[]) {
-  openMissingStandardStreams();
+  prepareStandardStreams();
   auto words = CommandShell::convertCmdArgsToList(count, vector);
   if (radioType() == 0) {
     std::cout << "'velltool' is not supported on this product." << std::endl;

@@ -112,13 +112,35 @@ TEST(StartUp, SaysWhyTheShellThreadCannotBeStarted) {
 
 TEST(StartUp, KeepsClosedStreamsFree) {
   const SimulatedDevice device("RADIO_TYPE=1");
-  for (const std::string closed : {">&-", "<&-", "2>&-", ">/dev/full"}) {
+  for (const std::string closed : {">&-", "<&-", "2>&-"}) {
     EXPECT_EQ(device.runTool("help " + closed).status, 0) << closed;
   }
   auto tool = device.start({"sh", "-c", "echo $$; exec \"$0\" 2>&-", VELLTOOL_PATH});
   const auto process = "/proc/" + tool.readLine();
   tool.readUntil(kPrompt);
   EXPECT_EQ(std::filesystem::read_symlink(process + "/fd/2"), "/dev/null");
+}
+
+TEST(Output, WaitsForRoomWhereItDoesNotBlock) {
+  // Both streams go to a pipe that is emptied byte by byte, and so is full most of the time.
+  const auto* line = R"(yes logdump tel | head -n 3000 |
+      perl -e 'use Fcntl; fcntl STDOUT, F_SETFL, O_WRONLY | O_NONBLOCK; exec @ARGV' "$0" 2>&1 |
+      dd bs=1 status=none)";
+  std::string expected;
+  for (int times = 0; times < 3000; ++times) {
+    expected += kPrompt + "Server is not running. Please try after server starts.\n";
+  }
+  EXPECT_EQ(SimulatedDevice("RADIO_TYPE=1\nMANAGER=absent").runLine(line).output,
+            expected + kPrompt);
+}
+
+TEST(Output, EndsTheRunWhenItIsLost) {
+  const SimulatedDevice device("RADIO_TYPE=1");
+  const ProcessResult lost = {1, "", "velltool: cannot write to standard output\n"};
+  EXPECT_EQ(device.runTool(">/dev/full <<< 'logdump tel'"), lost);
+  EXPECT_EQ(device.requests(), "");
+  EXPECT_EQ(device.runTool("logdump bb -- logdump tel >/dev/full"), lost);
+  EXPECT_EQ(device.requests().find("SystemLogs"), std::string::npos);
 }
 
 TEST(StartUp, ExportsItsInterfaceAndNothingElse) {
