@@ -1,7 +1,5 @@
 #include "platform/journal/entry_batch.h"
 
-#include <utility>
-
 namespace {
 
 constexpr std::size_t kMostEntries = 256;
@@ -9,8 +7,8 @@ constexpr std::size_t kMostBytes = 256UL * 1024;
 
 }  // namespace
 
-void EntryBatch::begin(Stamp stamp) {
-  entries.push_back({std::move(stamp), bytes.size(), {}});
+void EntryBatch::begin(std::uint64_t realtime) {
+  entries.push_back({realtime, bytes.size(), {}});
 }
 
 void EntryBatch::add(JournalField field, std::string_view value) {

@@ -7,10 +7,10 @@
 
 namespace {
 
-/// The journal takes no later time than this for a real one either.
+/// The journal itself takes a later time for damage.
 constexpr std::uint64_t kEndOfTime = 1ULL << 55U;
 
-/// The number that the whole of `digits` spells.
+/// The number in `digits`; nullopt unless all of them belong to it.
 template <typename Number>
 std::optional<Number> parseNumber(const std::optional<std::string_view>& digits, int base = 10) {
   if (!digits) {
@@ -29,7 +29,7 @@ std::optional<std::uint64_t> parseHexadecimal(std::optional<std::string_view> di
   return parseNumber<std::uint64_t>(digits, 16);
 }
 
-/// The first of the fields that holds a number, else 0.
+/// The number in the first of `fields` that holds one, else 0.
 template <typename Number>
 Number firstNumber(const JournalValues& values, std::initializer_list<JournalField> fields) {
   for (const auto field : fields) {

@@ -7,18 +7,19 @@
 #include <array>
 #include <string>
 
-/// When an entry was logged: what its field `SourceTime` says, else when it was stored (both in
-/// microseconds).
+/// When an entry was logged: its field `SourceTime` if that holds a time, else `realtime`, when it
+/// was stored. Both in microseconds.
 LogTime entryTime(std::optional<std::string_view> sourceTime, std::uint64_t realtime);
 
 /// Makes log entries from journal entries. Used on one thread.
 class EntryDecoder {
  public:
-  /// The entry's texts lie in `values`, or in the decoder where they had to be made valid UTF-8;
-  /// it is good until the next call. Numbers that cannot be read count as absent.
+  /// Decodes an entry that was stored at `realtime`, in microseconds. Its texts point into
+  /// `values`, or into the decoder where they had to be made valid UTF-8: valid until the next
+  /// call. A number that cannot be read counts as absent.
   LogEntry decode(const JournalValues& values, std::uint64_t realtime);
 
  private:
   MachineTimeZone timeZone;
-  std::array<std::string, 5> repaired;  ///< One for each text of an entry.
+  std::array<std::string, 5> repaired;  ///< The texts of one entry that were made valid.
 };

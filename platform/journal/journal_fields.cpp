@@ -14,7 +14,7 @@ struct Candidates {
   std::size_t count = 0;
 };
 
-/// Every item of every entry is looked up, and the length alone tells most of them apart.
+/// Every item of every entry is looked up. The length alone tells most names apart.
 constexpr auto kFieldsByLength = [] {
   std::array<Candidates, kLongestName + 1> fieldsByLength{};
   for (std::size_t field = 0; field < kJournalFieldNames.size(); ++field) {

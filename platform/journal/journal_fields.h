@@ -5,7 +5,7 @@
 #include <optional>
 #include <string_view>
 
-/// The fields of a journal entry that a log entry is made from, see systemd.journal-fields(7).
+/// The journal fields that a log entry is made from, see systemd.journal-fields(7).
 enum class JournalField : unsigned char {
   Message,
   SourceTime,
@@ -22,7 +22,7 @@ enum class JournalField : unsigned char {
   Category,
 };
 
-/// Their names in the journal, in the order of `JournalField`.
+/// The names of the fields, in the order of `JournalField`.
 inline constexpr std::array<std::string_view, 13> kJournalFieldNames = {
     "MESSAGE",
     "_SOURCE_REALTIME_TIMESTAMP",
@@ -42,21 +42,21 @@ constexpr std::size_t indexOf(JournalField field) {
   return static_cast<std::size_t>(field);
 }
 
-/// Something for each of the fields.
+/// One value for each field.
 template <typename Value>
 using PerJournalField = std::array<Value, kJournalFieldNames.size()>;
 
-/// The field of that name; empty for one that no log entry is made from.
+/// The field of that name; nullopt for one that no log entry is made from.
 std::optional<JournalField> findJournalField(std::string_view name);
 
-/// The values of one entry's fields, as stored: bytes of any kind, kept by someone else.
+/// The field values of one entry: any bytes, owned by the `EntryBatch` or whoever else made this.
 using JournalValues = PerJournalField<std::optional<std::string_view>>;
 
-/// The last component of a path: what follows its last slash.
+/// The part of `path` behind its last slash; all of it without one.
 std::string_view lastComponent(std::string_view path);
 
-/// The name of the process that logged an entry.
+/// The name of the process that logged an entry; nullopt when no field tells.
 std::optional<std::string_view> processOf(const JournalValues& values);
 
-/// The path of the image that issued an entry.
+/// The path of the image that issued an entry; nullopt when no field tells.
 std::optional<std::string_view> senderImagePathOf(const JournalValues& values);

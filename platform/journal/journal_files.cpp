@@ -19,10 +19,10 @@
 
 namespace {
 
-/// What lies in one folder, in the order of the paths; nothing when it cannot be read.
+/// The contents of one folder, sorted. Empty when it cannot be read.
 struct Folder {
   std::vector<std::filesystem::path> contents;
-  int error = 0;
+  int error = 0;  ///< errno of the reading; 0 also when there is no such folder.
 
   explicit Folder(const std::filesystem::path& path) {
     std::error_code failure;
@@ -37,7 +37,8 @@ struct Folder {
   }
 };
 
-/// Whether a folder of that name holds journals that are to be read.
+/// Whether `name` is that of a machine whose journals are to be read: on the machine itself, its
+/// own.
 bool isJournalFolder(const std::string& name) {
   sd_id128_t folder{};
   sd_id128_t machine{};
@@ -48,18 +49,18 @@ bool isJournalFolder(const std::string& name) {
          (sd_id128_get_machine(&machine) >= 0 && sd_id128_equal(folder, machine) != 0);
 }
 
-/// Journal files have this ending, and a tilde after it when they were not closed in good order.
+/// A tilde marks a file that was not closed in good order.
 bool isJournalFile(std::string_view name) {
   return name.ends_with(".journal") || name.ends_with(".journal~");
 }
 
-/// A file that is rotated is written to no more, and its name tells when and where that was.
+/// The name of a file that was rotated, and is no longer written to, has an "@" in it.
 bool isLiveFile(std::string_view name) {
   return name.find('@') == std::string_view::npos;
 }
 
-/// When the entries of a file were stored, by its own account.
-TimeSpan spanOf(sd_journal* journal, bool grows) {
+/// When the entries of a file were stored, by its header.
+TimeSpan spanOf(sd_journal* journal, bool isLive) {
   std::uint64_t first = 0;
   std::uint64_t last = 0;
   const int found = sd_journal_get_cutoff_realtime_usec(journal, &first, &last);
@@ -67,13 +68,13 @@ TimeSpan spanOf(sd_journal* journal, bool grows) {
     return {};
   }
   const auto endOfTime = std::numeric_limits<std::uint64_t>::max();
-  // Where a clock was set back, the times between may be any.
+  // In a file in which the clock was set back, entries may be of any time.
   return found < 0 || last < first ? TimeSpan{0, endOfTime}
-                                   : TimeSpan{first, grows ? endOfTime : last};
+                                   : TimeSpan{first, isLive ? endOfTime : last};
 }
 
-/// File descriptors that are held back while files are found, so that however many there are, some
-/// are left for what the process does with them.
+/// File descriptors that are held back while files are found: however many files there are, some
+/// descriptors are left for the rest of the process.
 class HeldBackDescriptors {
  public:
   HeldBackDescriptors() {
@@ -88,9 +89,9 @@ class HeldBackDescriptors {
 
 class Finder {
  public:
-  explicit Finder(std::size_t most) : atMost(most) {}
+  Finder(std::uint64_t earliest, std::size_t most) : from(earliest), atMost(most) {}
 
-  /// Opens what is there and not open yet. Returns whether that was anything.
+  /// Opens the files that are not known yet. Returns whether there may be more.
   bool findNewFiles() {
     const auto before = known.size();
     for (const auto* base : {"var/log/journal", "run/log/journal"}) {
@@ -131,9 +132,11 @@ class Finder {
 
   void noteFile(std::string_view name, FileDescriptor file, bool hasContent) {
     if (const auto journal = openJournal(file.duplicate())) {
-      const bool grows = isLiveFile(name);
-      files.found.push_back(
-          {std::move(file), grows, !name.ends_with('~'), spanOf(journal.get(), grows), {}, 0});
+      const bool isLive = isLiveFile(name);
+      const auto stored = spanOf(journal.get(), isLive);
+      if (stored.last >= from) {
+        files.found.push_back({std::move(file), isLive, !name.ends_with('~'), stored, {}});
+      }
     } else {
       note(errno);
       // An empty file is one that is just being made.
@@ -141,8 +144,8 @@ class Finder {
     }
   }
 
-  /// What is gone was rotated away, and what is forbidden is not the user's to read; for any other
-  /// reason something is missing.
+  /// A file that is gone was rotated away; one that is forbidden is not the user's to read. Any
+  /// other error means that something is missing.
   void noteUnopened(int error) {
     note(error == ENOENT ? 0 : error);
     files.damaged =
@@ -155,27 +158,14 @@ class Finder {
     }
   }
 
+  std::uint64_t from;
   std::size_t atMost;
-  std::set<std::pair<dev_t, ino_t>> known;
+  std::set<std::pair<dev_t, ino_t>> known;  ///< The regular files that were opened.
 };
 
-/// Notes which times each of the files, which are in the order of their first entries, has in
-/// common with others.
-void findSharedTimes(std::vector<JournalFile>& files) {
-  for (auto file = files.begin(); file != files.end(); ++file) {
-    for (auto later = file + 1; later != files.end() && later->stored.first <= file->stored.last;
-         ++later) {
-      for (auto* shared : {&file->shared, &later->shared}) {
-        shared->first = std::min(shared->first, later->stored.first);
-        shared->last = std::max(shared->last, std::min(file->stored.last, later->stored.last));
-      }
-    }
-  }
-}
-
-/// Every journal file is open while it waits to be read, and there may be more of them than the
-/// usual limit allows, which is meant for programs that use select(2).
-void liftFileLimit() {
+/// Journal files stay open while they wait to be read, and there may be more of them than the soft
+/// limit allows. That is kept low for programs that use select(2).
+void raiseFileLimit() {
   struct rlimit limit {};
   if (getrlimit(RLIMIT_NOFILE, &limit) == 0 && limit.rlim_cur < limit.rlim_max) {
     limit.rlim_cur = limit.rlim_max;
@@ -189,10 +179,10 @@ std::uint64_t journalTime(LogTime time) {
   return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
 }
 
-JournalFiles findJournalFiles(std::size_t atMost) {
-  liftFileLimit();
+JournalFiles findJournalFiles(std::uint64_t from, std::size_t atMost) {
+  raiseFileLimit();
   const HeldBackDescriptors heldBack;
-  Finder finder(atMost);
+  Finder finder(from, atMost);
   while (finder.findNewFiles()) {
   }
   auto& found = finder.files.found;
@@ -200,11 +190,20 @@ JournalFiles findJournalFiles(std::size_t atMost) {
                    [](const JournalFile& left, const JournalFile& right) {
                      return left.stored.first < right.stored.first;
                    });
-  for (std::size_t number = 0; number < found.size(); ++number) {
-    found[number].number = number;
-  }
-  findSharedTimes(found);
+  findOverlaps(found);
   return std::move(finder.files);
+}
+
+void findOverlaps(std::vector<JournalFile>& files) {
+  for (auto file = files.begin(); file != files.end(); ++file) {
+    for (auto later = file + 1; later != files.end() && later->stored.first <= file->stored.last;
+         ++later) {
+      for (auto* overlap : {&file->overlap, &later->overlap}) {
+        overlap->first = std::min(overlap->first, later->stored.first);
+        overlap->last = std::max(overlap->last, std::min(file->stored.last, later->stored.last));
+      }
+    }
+  }
 }
 
 JournalPtr openJournal(FileDescriptor file) {

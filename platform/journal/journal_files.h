@@ -11,13 +11,13 @@
 #include <limits>
 #include <vector>
 
-/// Owns an open journal. It is opened, used and closed on one thread, see sd-journal(3).
+/// Owns an open journal, which one thread opens, uses and closes, see sd-journal(3).
 using JournalPtr = HandlePtr<sd_journal, sd_journal_close>;
 
-/// A point in time as the journal has it, in microseconds; it takes 0 for none.
+/// `time` as the journal counts it: microseconds, of which 0 stands for no time.
 std::uint64_t journalTime(LogTime time);
 
-/// From when to when, in microseconds, both included; no time at all when `last` is before `first`.
+/// From when to when, in microseconds, both included. Empty when `last` is before `first`.
 struct TimeSpan {
   std::uint64_t first = std::numeric_limits<std::uint64_t>::max();
   std::uint64_t last = 0;
@@ -25,37 +25,42 @@ struct TimeSpan {
   [[nodiscard]] bool holds(std::uint64_t time) const { return first <= time && time <= last; }
 };
 
-/// One journal file, held open so that it cannot go away.
+/// One journal file. Held open, so that removing it does not take it away.
 struct JournalFile {
   FileDescriptor file;
-  bool grows = false;      ///< Whether entries may still be added to it.
-  bool wasClosed = false;  ///< Whether it was closed in good order, as far as its name tells.
-  TimeSpan stored;         ///< When its entries were stored; has no end in a file that grows.
-  TimeSpan shared;         ///< Outside of this, no other file has entries of the same time.
-  std::size_t number = 0;  ///< Its place among the files.
+  bool isLive = false;     ///< Whether entries may still be added to it.
+  bool wasClosed = false;  ///< Whether it was closed in good order, by its name.
+  TimeSpan stored;         ///< When its entries were stored. Without end in a live file.
+  TimeSpan overlap;        ///< Outside of it, no other file has entries of the same time.
 };
 
-/// The device's journal files, in the order of their first entries.
+/// The device's journal files, by the times of their first entries.
 ///
-/// The library can open them all as one, but then every step asks every file, and nothing is given
-/// back before the end: reading file after file makes a step cost the same however many there are.
+/// The library can open them all as one journal. Each step then asks every file, and no memory is
+/// given back before the end. Reading one file after the other makes a step cost the same however
+/// many files there are.
 struct JournalFiles {
   std::vector<JournalFile> found;
-  int error = 0;         ///< Why the first that could not be opened could not (errno); else 0.
-  bool damaged = false;  ///< Whether one is missing that is there and may be read.
+  int error = 0;         ///< errno of the first file that failed to open, else 0.
+  bool damaged = false;  ///< Whether a file is missing that exists and may be read.
 };
 
-/// Finds the files below the sysroot, or the local machine's own, as sd_journal_open(3) does: those
-/// of namespaces are not among them. Files that are rotated meanwhile are found under their new
-/// names. Stops once `atMost` are found. The process may have as many files open afterwards as its
-/// hard limit allows. From any thread.
-JournalFiles findJournalFiles(std::size_t atMost = std::numeric_limits<std::size_t>::max());
+/// Finds the journal files below the sysroot, or the local machine's, as sd_journal_open(3) does:
+/// those of namespaces are not among them. A file that is rotated meanwhile is found under its new
+/// name. Leaves out files that end before `from`, in microseconds. Stops after `atMost` files.
+/// Raises the process's soft limit of open files to the hard limit. From any thread.
+JournalFiles findJournalFiles(std::uint64_t from,
+                              std::size_t atMost = std::numeric_limits<std::size_t>::max());
 
-/// Opens the journal in `file`; null, and errno is set, when that fails; null, and errno is as it
-/// was, when there is no `file`. Pages of the file that are
-/// lost while it is open do not end the process, see `surviveLostPages`.
+/// Notes for each file, which are in the order of their first entries, the span that it shares with
+/// others.
+void findOverlaps(std::vector<JournalFile>& files);
+
+/// Opens the journal in `file`. Null when that fails; errno is then set, but not for want of a
+/// `file`. Survives lost pages of the file, see `surviveLostPages`. Used on the thread that closes
+/// the journal.
 JournalPtr openJournal(FileDescriptor file);
 
-/// Whether the library still has the file of `journal`, which takes up room on the disk: one that
-/// it finds damaged it drops, and then goes on as if it had come to its end.
+/// Whether the library still has the file of `journal`. It drops a file that it finds damaged, and
+/// goes on as if that had ended. False for null.
 bool hasJournalFile(sd_journal* journal);

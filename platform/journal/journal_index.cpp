@@ -2,6 +2,7 @@
 
 #include "platform/journal/journal_fields.h"
 
+#include <algorithm>
 #include <functional>
 #include <string_view>
 #include <utility>
@@ -12,14 +13,13 @@ std::string_view nameOf(JournalField field) {
   return kJournalFieldNames[indexOf(field)];
 }
 
-/// What is found in the index.
 struct Finding {
   std::vector<std::string> matches;
-  bool hasValues = false;  ///< Whether there was any value, wanted or not.
+  bool hasValues = false;  ///< Whether the index listed any value, wanted or not.
 };
 
-/// Adds a match for each of the distinct values of `field` that is `wanted`. False when the index
-/// cannot list them all.
+/// Adds a match for each distinct value of `field` that is `wanted`. False when the index cannot
+/// list them all.
 bool addWantedValues(sd_journal* journal, JournalField field,
                      const std::function<bool(std::string_view)>& wanted, Finding& finding) {
   const std::string name(nameOf(field));
@@ -52,12 +52,44 @@ std::optional<std::vector<std::string>> findIndexMatches(sd_journal* journal,
   const auto add = [&](JournalField field, const auto& wanted) {
     return addWantedValues(journal, field, wanted, finding);
   };
-  // An entry without an executable goes by its other names, and one with an executable has them
-  // too: what they match in vain is asked and passed over.
+  // An entry without an executable is selected by its other names. An entry with an executable has
+  // those names too: it may match by them and still not be selected.
   const bool listed = add(JournalField::Executable, selectsExecutable) &&
                       add(JournalField::SenderImagePath, selectsPath) &&
                       add(JournalField::CommandName, selectsName) &&
                       add(JournalField::SyslogIdentifier, selectsName);
-  // Entries hardly ever have none of these fields, and an index that knows of none is damaged.
+  // Hardly any journal has none of these fields: an index that lists no value at all is damaged.
   return listed && finding.hasValues ? std::optional(std::move(finding.matches)) : std::nullopt;
+}
+
+/// The library takes matches of one field for alternatives. Different fields need a disjunction.
+bool JournalIndex::enable(sd_journal* journal) {
+  if (enabled) {
+    return true;
+  }
+  std::string_view lastName;
+  enabled = std::all_of(matches.begin(), matches.end(), [&](const std::string& match) {
+    const auto name = std::string_view(match).substr(0, match.find('='));
+    const bool sameField = std::exchange(lastName, name) == name;
+    return (sameField || sd_journal_add_disjunction(journal) >= 0) &&
+           sd_journal_add_match(journal, match.data(), match.size()) >= 0;
+  });
+  if (!enabled) {
+    disable(journal);
+  }
+  return enabled;
+}
+
+void JournalIndex::disable(sd_journal* journal) {
+  sd_journal_flush_matches(journal);
+  enabled = false;
+}
+
+void JournalIndex::chooseNextStep(sd_journal* journal, bool selected) {
+  strategy.noteStep(selected);
+  if (strategy.isByIndex() && !enabled) {
+    enable(journal);
+  } else if (!strategy.isByIndex() && enabled) {
+    disable(journal);
+  }
 }

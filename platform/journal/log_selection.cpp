@@ -7,7 +7,7 @@
 
 namespace {
 
-/// Programs say what their image path is, so there is no end to how many they can make up.
+/// Programs name their own image path, so they can make up any number: these bound the memory.
 constexpr std::size_t kMostVerdicts = 4096;
 constexpr std::size_t kLongestKnownPath = 4096;
 

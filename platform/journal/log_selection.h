@@ -12,21 +12,22 @@
 #include <unordered_set>
 #include <vector>
 
-/// A filter made ready to be asked about many entries: what a comparison costs is paid once for
-/// each distinct text. Texts are given as they are stored, that is, not always valid UTF-8. Used on
-/// one thread.
+/// A filter prepared for many entries: texts are folded once, and each distinct image path is
+/// compared once. Takes texts as stored, which need not be valid UTF-8. On one thread.
 class LogSelection {
  public:
-  /// Without a filter everything is selected.
+  /// Without a filter every entry is selected.
   explicit LogSelection(const std::optional<LogFilter>& filter);
 
-  /// Whether an entry is selected.
+  /// Whether an entry with these values is selected.
   [[nodiscard]] bool selects(const JournalValues& values) const;
 
-  /// Whether everything is selected.
+  /// Whether every entry is selected.
   [[nodiscard]] bool isEverything() const { return everything; }
 
+  /// Whether an entry of that process is selected for it.
   [[nodiscard]] bool selectsProcess(std::string_view process) const;
+  /// Whether an entry of that image path is selected for it.
   [[nodiscard]] bool selectsImagePath(std::string_view imagePath) const;
 
  private:

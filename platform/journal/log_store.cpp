@@ -1,24 +1,22 @@
 #include "platform/log_store.h"
 
+#include "platform/journal/batch_queue.h"
 #include "platform/journal/entry_decoder.h"
-#include "platform/journal/entry_merge.h"
-#include "platform/journal/reading_thread.h"
+#include "platform/journal/journal_reader.h"
 
-#include <array>
 #include <atomic>
 #include <csignal>
 #include <cstring>
 #include <exception>
-#include <list>
 #include <system_error>
 #include <thread>
 #include <utility>
 
-/// The device's journals, of which one at least can be read.
+/// Stands for the device's journals, at least one of which can be read.
 class LogSource {};
 
 void LogStore::prepare(const Completion& completion) const {
-  const auto files = findJournalFiles(1);
+  const auto files = findJournalFiles(0, 1);
   if (!files.found.empty()) {
     completion(std::make_shared<LogSource>(), std::nullopt);
   } else {
@@ -32,10 +30,6 @@ namespace {
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
 
-/// While entries of one are delivered, the other reads on. On two cores two threads are as many as
-/// have work to do.
-constexpr std::size_t kReadingThreads = 2;
-
 /// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
 /// on this thread shows as an error then. Threads started from here on do the same.
 void blockSignals() {
@@ -47,17 +41,62 @@ void blockSignals() {
   pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
 }
 
+/// The reading thread: puts the selected entries into a queue. One that is destroyed early, because
+/// the delivering has failed, closes the queue first, as the thread may be waiting for room.
+class ReadingThread {
+ public:
+  /// `into` and `filter` must live longer. Throws std::system_error when no thread can be had.
+  ReadingThread(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& into)
+      : queue(into), thread([this, &filter, from] { run(filter, from); }) {}
+  ReadingThread(const ReadingThread&) = delete;
+  ReadingThread& operator=(const ReadingThread&) = delete;
+  ~ReadingThread() {
+    if (thread.joinable()) {
+      queue.close();
+      thread.join();
+    }
+  }
+
+  /// Waits for the thread, after the queue has ended. Returns whether nothing is missing. To be
+  /// called once.
+  bool finish() {
+    thread.join();
+    return complete;
+  }
+
+ private:
+  void run(const std::optional<LogFilter>& filter, LogTime from) {
+    try {
+      JournalReader reader(filter, from);
+      EntryBatch batch;
+      bool more = true;
+      while (more) {
+        more = reader.read(batch);
+        more = queue.push(batch) && more;
+      }
+      complete = reader.isComplete();
+    } catch (const std::exception&) {
+      // No memory is left, and what is not queued by now is missing.
+    }
+    queue.finish();
+  }
+
+  BatchQueue& queue;
+  bool complete = false;  ///< The thread's until it has ended.
+  std::thread thread;
+};
+
 }  // namespace
 
-/// What a reader and its threads share. Some read journal files, and the one that is the reader's
-/// own, as far as the outside goes, delivers.
+/// What a reader shares with its two threads. One reads the journal; the other, which is the
+/// reader's own as far as its handlers can tell, delivers.
 class LogReader::Session {
  public:
-  /// `self` owns this; the thread keeps it until it has run out.
+  /// `self` owns this; the delivering thread holds it until it ends.
   void start(const std::shared_ptr<Session>& self, LogTime from);
   void stop();
 
-  /// Ends the thread in good order when it is at its end, and else lets it run out on its own.
+  /// Stops the delivering thread, and waits for it if its last handler has been called.
   void release();
 
   unsigned flags = 0;
@@ -68,13 +107,12 @@ class LogReader::Session {
  private:
   void run(LogTime from);
   unsigned long deliverAll(LogTime from);
-  bool readAll(LogTime from);
   void deliver(const JournalValues& values, std::uint64_t realtime);
   void end(unsigned long reason);
 
-  LogTime position;  ///< Belongs to the delivering thread once it is started.
+  LogTime position;  ///< The delivering thread's once that is started.
   EntryDecoder decoder;
-  std::array<EntryPipe, kReadingThreads> pipes;
+  BatchQueue queue;
   std::atomic<bool> stopped = false;
   std::atomic<bool> ended = false;
   std::thread delivering;
@@ -91,9 +129,7 @@ void LogReader::Session::start(const std::shared_ptr<Session>& self, LogTime fro
 
 void LogReader::Session::stop() {
   stopped = true;
-  for (auto& pipe : pipes) {
-    pipe.close();
-  }
+  queue.close();
 }
 
 void LogReader::Session::release() {
@@ -122,35 +158,22 @@ void LogReader::Session::end(unsigned long reason) {
   }
 }
 
+/// Delivers everything, or until the reader is stopped. Returns the reason of the end.
 unsigned long LogReader::Session::deliverAll(LogTime from) {
   bool complete = false;
   try {
-    complete = readAll(from);
+    ReadingThread reading(filter, from, queue);
+    EntryBatch batch;
+    while (queue.pop(batch)) {
+      for (std::size_t entry = 0; entry < batch.size() && !stopped; ++entry) {
+        deliver(batch.valuesOf(entry), batch.realtimeOf(entry));
+      }
+    }
+    complete = reading.finish();
   } catch (const std::exception&) {
-    // There is no thread or no memory to be had.
+    // No thread or no memory can be had.
   }
   return complete ? kLogReaderAtEnd : kLogReaderReadError;
-}
-
-/// Reads and delivers everything, or until the reader is stopped. Returns whether nothing is
-/// missing.
-bool LogReader::Session::readAll(LogTime from) {
-  auto files = findJournalFiles();
-  JournalFileQueue queue(std::move(files.found), from);
-  auto first = queue.takeFirst(kReadingThreads);
-  std::list<ReadingThread> threads;
-  for (std::size_t at = 0; at < kReadingThreads; ++at) {
-    threads.emplace_back(std::move(first.at(at)), queue, filter, from, pipes.at(at));
-  }
-  EntryMerge entries(pipes);
-  while (!stopped && entries.next()) {
-    deliver(entries.values(), entries.realtime());
-  }
-  bool complete = !files.damaged;
-  for (auto& thread : threads) {
-    complete = thread.finish() && complete;
-  }
-  return complete;
 }
 
 void LogReader::Session::deliver(const JournalValues& values, std::uint64_t realtime) {

@@ -11,12 +11,11 @@ namespace {
 struct sigaction formerAction {};
 std::uintptr_t pageSize = 0;
 
-// Of a thread's own, and of types that a signal handler may touch on the thread it interrupts.
+// Each thread has its own. A signal handler may touch these types on the thread that it interrupts.
 thread_local volatile std::sig_atomic_t survives = 0;
 thread_local volatile unsigned long lost = 0;
 
-/// Puts a page of zeros in place of the one that is gone, which holds `address`. False when that
-/// cannot be done.
+/// Maps a page of zeros over the lost page that holds `address`. False when mmap(2) fails.
 bool replacePage(void* address) {
   const auto offset = reinterpret_cast<std::uintptr_t>(address) % pageSize;
   auto* const page = static_cast<char*>(address) - offset;
@@ -28,7 +27,8 @@ void handleBusError(int number, siginfo_t* info, void* /*context*/) {
     lost = lost + 1;
     return;
   }
-  // What touched the page does so again, and meets what was there before; what was sent is sent on.
+  // Returning repeats the access, which now gets the former action. A sent signal has to be
+  // re-sent.
   sigaction(SIGBUS, &formerAction, nullptr);
   if (info->si_code != BUS_ADRERR) {
     raise(number);

@@ -6,7 +6,7 @@
 
 namespace {
 
-/// No zone changes its offset twice within this, so equal offsets at both ends hold between them.
+/// No zone changes its offset twice in so short a time: equal offsets at both ends hold in between.
 using QuarterHours = std::chrono::duration<std::int64_t, std::ratio<15L * 60>>;
 
 std::chrono::seconds askLibrary(std::chrono::sys_seconds time) {

@@ -4,8 +4,8 @@
 
 #include <optional>
 
-/// The zone of the machine, as the C library finds it (tzset(3)) when this is made. Entries that
-/// follow each other closely are answered from memory.
+/// The machine's time zone, read when this is made, see tzset(3). Asks the C library once for
+/// entries that follow each other closely. On one thread.
 class MachineTimeZone : public TimeZone {
  public:
   MachineTimeZone();

@@ -1,8 +1,8 @@
-#include "platform/journal/way_choice.h"
+#include "platform/journal/step_strategy.h"
 
 #include <algorithm>
 
-void WayChoice::noteStep(bool selected) {
+void StepStrategy::noteStep(bool selected) {
   constexpr std::size_t kIndexSteps = 512;
   constexpr std::size_t kFewestPlainSteps = 32;
   ++steps;
@@ -14,9 +14,9 @@ void WayChoice::noteStep(bool selected) {
   }
 }
 
-/// With the index a step costs about 0.3 of a plain one for each match, and without it there is a
-/// step for each entry that is not selected. As one more is selected than was seen, many matches
-/// take many steps to be worth it.
-bool WayChoice::isIndexWorthwhile() const {
+/// An indexed step costs a plain step and 0.3 of one for each match. Plain steps also visit every
+/// entry that is not selected. Counting one selected entry more than were seen keeps an index with
+/// many matches from being tried too early.
+bool StepStrategy::isIndexWorthwhile() const {
   return matchCount > 0 && (selectedSteps + 1) * (10 + 3 * matchCount) < steps * 10;
 }

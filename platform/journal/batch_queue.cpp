@@ -1,15 +1,15 @@
-#include "platform/journal/entry_pipe.h"
+#include "platform/journal/batch_queue.h"
 
 #include <utility>
 
 namespace {
 
-constexpr std::size_t kMostFilled = 24;
+constexpr std::size_t kMostBatches = 24;
 constexpr std::size_t kMostBytes = 6UL * 1024 * 1024;
 
 }  // namespace
 
-bool EntryPipe::push(EntryBatch& batch) {
+bool BatchQueue::push(EntryBatch& batch) {
   std::unique_lock lock(mutex);
   changed.wait(lock, [&] { return closed || hasRoomFor(batch); });
   if (closed) {
@@ -29,19 +29,19 @@ bool EntryPipe::push(EntryBatch& batch) {
   return true;
 }
 
-/// Whether what is under way stays within bounds; one batch can go, however long its messages are.
-bool EntryPipe::hasRoomFor(const EntryBatch& batch) const {
+/// Bounds the queue in batches and in bytes. One batch always has room, however large it is.
+bool BatchQueue::hasRoomFor(const EntryBatch& batch) const {
   return filled.empty() ||
-         (filled.size() < kMostFilled && filledBytes + batch.byteCount() <= kMostBytes);
+         (filled.size() < kMostBatches && filledBytes + batch.byteCount() <= kMostBytes);
 }
 
-void EntryPipe::finish() {
+void BatchQueue::finish() {
   const std::lock_guard lock(mutex);
   finished = true;
   changed.notify_all();
 }
 
-bool EntryPipe::pop(EntryBatch& batch) {
+bool BatchQueue::pop(EntryBatch& batch) {
   std::unique_lock lock(mutex);
   batch.clear();
   emptied.push_back(std::move(batch));
@@ -56,7 +56,7 @@ bool EntryPipe::pop(EntryBatch& batch) {
   return true;
 }
 
-void EntryPipe::close() {
+void BatchQueue::close() {
   const std::lock_guard lock(mutex);
   closed = true;
   changed.notify_all();

@@ -1,4 +1,4 @@
-#include "platform/journal/entry_copies.h"
+#include "platform/journal/duplicate_filter.h"
 
 #include <algorithm>
 #include <string_view>
@@ -6,7 +6,7 @@
 
 namespace {
 
-/// One part of a cursor, with the `key` and the "=" that it starts with.
+/// The part "KEY=value" of a cursor, which looks like "s=5f2a...;i=1c3;b=...". Empty without one.
 std::string_view partOf(std::string_view cursor, char key) {
   while (!cursor.empty()) {
     const auto part = cursor.substr(0, cursor.find(';'));
@@ -29,26 +29,27 @@ std::string partsOf(std::string_view cursor, std::string_view keys) {
 
 }  // namespace
 
-bool EntryCopies::isCopy(const EntryBatch::Stamp& stamp) {
-  if (stamp.cursor.empty()) {
+bool DuplicateFilter::isDuplicate(std::uint64_t time, std::string cursor) {
+  if (cursor.empty()) {
     return false;
   }
-  if (std::exchange(realtime, stamp.realtime) != stamp.realtime) {
+  if (std::exchange(realtime, time) != time) {
     places.clear();
     sequences.clear();
-    onlyOne = stamp.cursor;
+    first = std::move(cursor);
     return false;
   }
-  if (!onlyOne.empty()) {
-    isKnown(std::exchange(onlyOne, {}));
+  if (!first.empty()) {
+    isKnown(std::exchange(first, {}));
   }
-  return isKnown(stamp.cursor);
+  return isKnown(cursor);
 }
 
-/// Whether an entry is known already; if not, it is from now on. In its own sequence an entry goes
-/// by its number, and a program may well log the same twice at one time; entries of different
-/// sequences go by boot, times and the hash of their content.
-bool EntryCopies::isKnown(const std::string& cursor) {
+/// Whether an equal entry is known. Makes this one known if not.
+///
+/// Entries of one sequence are equal when their numbers are: a program may log the same text twice
+/// at one time. Entries of different sequences are equal when boot, times and content hash are.
+bool DuplicateFilter::isKnown(const std::string& cursor) {
   const std::string sequence(partOf(cursor, 's'));
   const auto known = sequences.emplace(partsOf(cursor, "bmtx"), sequence).first;
   return known->second != sequence || !places.insert(partsOf(cursor, "si")).second;

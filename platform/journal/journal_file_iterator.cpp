@@ -1,0 +1,230 @@
+// The walk through one journal file.
+//
+//                  start                advance            advance
+//     Waiting ------+------> Walking ------------> AtEnd ----------> Closed
+//                   |           |  no entry left, or damaged           ^
+//                   |           +--------------------------------------+
+//                   +--- no entry from `earliest` on, or none selected +
+//
+// The end. A live file grows while it is read. Its end is therefore fixed at the start: the cursor
+// of the entry that is the last one then. With an index the end is the last entry that matches,
+// which saves the walk to the end of the file. Only a plain walk through a file that is not live
+// needs no end in advance: it ends where the library has no next entry.
+//
+// The index. The library steps either by its index (matches are set) or plainly (none are), and can
+// change between the two at any entry. `JournalIndex` chooses. Entries that match are a superset of
+// those that are selected, so the caller checks each entry in either case.
+//
+// Damage. The library reports little of it: it drops a file that it finds damaged and goes on as if
+// that had ended. So each end is checked against a second account of it:
+//   - with an index: the entry that was last when the walk started is the one the walk ends at, and
+//     the index has nothing behind it;
+//   - in a live file: the entry that the header names as last is not newer than the one found;
+//   - in any other: the last entry has the time that the header names;
+//   - always: the library still has the file, and no page of it was lost.
+// If an index fails the check, its file is opened again and walked plainly behind the entry that
+// was reached. Whatever fails, `damaged` says that entries may be missing.
+//
+// Cost. A plain step is one entry of an array that the library has mapped. A step by the index
+// costs 0.3 of that more for each match. A cursor costs as much as reading an entry, so it is asked
+// for only by a caller that needs it.
+
+#include "platform/journal/journal_file_iterator.h"
+
+#include "platform/journal/lost_pages.h"
+#include "platform/portable/handle.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <string_view>
+#include <utility>
+
+namespace {
+
+void addItem(std::string_view item, EntryBatch& batch) {
+  const auto equals = item.find('=');
+  if (const auto field = findJournalField(item.substr(0, equals))) {
+    batch.add(*field, item.substr(equals + 1));
+  }
+}
+
+/// When the last entry was stored, by the file's header. A live file's may be newer than the end of
+/// the walk.
+std::uint64_t timeOfLast(sd_journal* journal) {
+  std::uint64_t first = 0;
+  std::uint64_t last = 0;
+  return sd_journal_get_cutoff_realtime_usec(journal, &first, &last) > 0 ? last : 0;
+}
+
+}  // namespace
+
+JournalFileIterator::JournalFileIterator(JournalFile journalFile, std::uint64_t from)
+    : file(std::move(journalFile)), earliest(from), latest(std::max(file.stored.first, from)) {}
+
+void JournalFileIterator::start(const LogSelection& selection) {
+  const LostPageWatch watch;
+  if (reopen()) {
+    damaged = file.isLive && !fixEndOfFile();
+    const auto answer = askIndex(selection);
+    if (answer == Answer::Damaged) {
+      goOnWithoutIndex(0);
+    } else if (answer == Answer::NoneSelected || (!end.cursor.empty() && end.realtime < earliest)) {
+      close(true);
+    } else if (!goToFirst()) {
+      close(timeOfLast(journal.get()) < earliest);
+    }
+  } else {
+    close(false);
+  }
+  damaged = damaged || watch.sawLoss();
+}
+
+/// Opens the file, which can be repeated while there are file descriptors to be had.
+bool JournalFileIterator::reopen() {
+  auto spare = file.file.duplicate();
+  journal = openJournal(std::move(file.file));
+  file.file = std::move(spare);
+  return journal != nullptr;
+}
+
+/// Fixes the last entry that the library can step to now as the end.
+bool JournalFileIterator::fixEnd() {
+  if (sd_journal_seek_tail(journal.get()) < 0 || sd_journal_previous(journal.get()) <= 0 ||
+      sd_journal_get_realtime_usec(journal.get(), &end.realtime) < 0) {
+    return false;
+  }
+  end.cursor = cursor();
+  return !end.cursor.empty();
+}
+
+/// Fixes the last entry of the file as the end. False when there should be a newer one, by the
+/// file's header: the end of the file is damaged.
+bool JournalFileIterator::fixEndOfFile() {
+  const auto last = timeOfLast(journal.get());
+  return fixEnd() && last <= end.realtime;
+}
+
+/// Looks up `selection` in the index, and fixes the end by it. The index of a file that was not
+/// closed in good order may lack entries. What damaged the end of a file may have damaged its
+/// index.
+JournalFileIterator::Answer JournalFileIterator::askIndex(const LogSelection& selection) {
+  const bool trusted = file.wasClosed && !damaged && !selection.isEverything();
+  auto matches = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
+  if (!hasJournalFile(journal.get())) {
+    return Answer::Damaged;
+  }
+  if (!matches || matches->empty()) {
+    return matches ? Answer::NoneSelected : Answer::Walk;
+  }
+  index = JournalIndex(std::move(*matches));
+  if (!index.enable(journal.get())) {
+    index = JournalIndex();
+    return Answer::Walk;
+  }
+  // An index that lists values which no entry has is damaged.
+  const bool found = fixEnd();
+  index.disable(journal.get());
+  return found ? Answer::Walk : Answer::Damaged;
+}
+
+bool JournalFileIterator::read(EntryBatch& batch) {
+  batch.begin(current);
+  const LostPageWatch watch;
+  const void* data = nullptr;
+  std::size_t length = 0;
+  sd_journal_restart_data(journal.get());
+  int more = sd_journal_enumerate_data(journal.get(), &data, &length);
+  for (; more > 0; more = sd_journal_enumerate_data(journal.get(), &data, &length)) {
+    addItem({static_cast<const char*>(data), length}, batch);
+  }
+  const bool whole = more == 0 && !watch.sawLoss();
+  if (!whole) {
+    batch.dropLast();
+    damaged = true;
+  }
+  return whole;
+}
+
+std::string JournalFileIterator::cursor() {
+  const LostPageWatch watch;
+  char* text = nullptr;
+  if (sd_journal_get_cursor(journal.get(), &text) < 0) {
+    return {};
+  }
+  const HandlePtr<char, std::free> owner(text);
+  damaged = damaged || watch.sawLoss();
+  return text;
+}
+
+void JournalFileIterator::advance(bool selected) {
+  const LostPageWatch watch;
+  const auto left = current;
+  if (state == State::AtEnd) {
+    if (!index.isUsed() || isEndOfIndex()) {
+      close(true);
+      return;
+    }
+  } else {
+    index.chooseNextStep(journal.get(), selected);
+    if (goToNext() && !watch.sawLoss()) {
+      return;
+    }
+  }
+  if (index.isUsed()) {
+    goOnWithoutIndex(left);
+  } else {
+    close(isEndOfFile() && !watch.sawLoss());
+  }
+}
+
+/// Whether the index has nothing behind the entry that it named as its last, as far as that can be
+/// told in a live file.
+bool JournalFileIterator::isEndOfIndex() {
+  const bool found = index.enable(journal.get()) && sd_journal_next(journal.get()) > 0;
+  return hasJournalFile(journal.get()) && (file.isLive || !found);
+}
+
+/// Whether a plain walk that has no next entry is at the end of the file, rather than at a damaged
+/// place. Says no in a live file, whose end is known in advance.
+bool JournalFileIterator::isEndOfFile() {
+  return !file.isLive && hasJournalFile(journal.get()) && current == timeOfLast(journal.get());
+}
+
+bool JournalFileIterator::goToFirst() {
+  return sd_journal_seek_realtime_usec(journal.get(), earliest) >= 0 && goToNext();
+}
+
+bool JournalFileIterator::goToNext() {
+  if (sd_journal_next(journal.get()) <= 0 ||
+      sd_journal_get_realtime_usec(journal.get(), &current) < 0) {
+    return false;
+  }
+  latest = std::max(latest, current);
+  const bool isLast =
+      current == end.realtime && sd_journal_test_cursor(journal.get(), end.cursor.c_str()) > 0;
+  state = isLast ? State::AtEnd : State::Walking;
+  return true;
+}
+
+/// Gives up a damaged index: it cannot be asked, or ends elsewhere than it said before. Walks
+/// plainly to the first entry after the time `left`, from the start: seeking a time uses an index
+/// too.
+void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
+  damaged = true;
+  index = JournalIndex();
+  end = End();
+  bool found = reopen() && (!file.isLive || fixEnd()) && goToFirst();
+  while (found && current <= left) {
+    found = state == State::Walking && goToNext();
+  }
+  if (!found) {
+    close(false);
+  }
+}
+
+void JournalFileIterator::close(bool complete) {
+  damaged = damaged || !complete || !hasJournalFile(journal.get());
+  state = State::Closed;
+  journal.reset();
+  file.file = FileDescriptor();
+}
