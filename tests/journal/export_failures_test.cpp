@@ -1,6 +1,7 @@
 // What an export does when the journal or the file is not as it should be.
 
 #include "platform/files.h"
+#include "platform/log_store.h"
 #include "tests/journal/device_journal.h"
 
 #include <gtest/gtest.h>
@@ -9,6 +10,8 @@
 #include <algorithm>
 #include <fstream>
 #include <functional>
+#include <future>
+#include <new>
 #include <random>
 #include <string>
 #include <vector>
@@ -192,6 +195,20 @@ TEST(ExportFailures, WriteAtTheEndOfAFileThatSomebodyEmptied) {
   fs::resize_file(device.output(), 0);
   ASSERT_FALSE(file->append("two\n"));
   EXPECT_EQ(fs::file_size(device.output()), 4);
+}
+
+TEST(ExportFailures, EndWithReasonOneWhenDeliveringFindsNoMemory) {
+  // More entries than are under way at a time, so that the reading waits for room.
+  const DeviceJournal device;
+  storeTenths(device, "system.journal");
+  setenv("VELL_SYSROOT", device.root().c_str(), 1);
+  LogReader reader(nullptr);
+  std::promise<unsigned long> reason;
+  reader.setFlags(kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages);
+  reader.setEntryHandler([](const LogEntry&) { throw std::bad_alloc(); });
+  reader.setInvalidationHandler([&](unsigned long why, LogTime) { reason.set_value(why); });
+  reader.activate(LogTime());
+  EXPECT_EQ(reason.get_future().get(), kLogReaderReadError);
 }
 
 TEST(ExportFailures, KeepANewFileToItsOwner) {
