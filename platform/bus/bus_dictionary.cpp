@@ -70,11 +70,9 @@ bool readEntry(sd_bus_message* message, MessageDict& dict, bool& end) {
 }  // namespace
 
 bool appendText(sd_bus_message* message, const std::string& text) {
-  auto valid = validUtf8(text);
-  for (auto nul = valid.find('\0'); nul != std::string::npos; nul = valid.find('\0', nul)) {
-    valid.replace(nul, 1, "\xEF\xBF\xBD");
-  }
-  return sd_bus_message_append_basic(message, SD_BUS_TYPE_STRING, valid.c_str()) >= 0;
+  // The library takes no noncharacters either, although the bus itself would.
+  const auto taken = interchangeText(text);
+  return sd_bus_message_append_basic(message, SD_BUS_TYPE_STRING, taken.c_str()) >= 0;
 }
 
 bool appendDictionary(sd_bus_message* message, const MessageDict& dict) {

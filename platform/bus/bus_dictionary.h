@@ -7,7 +7,7 @@
 /// The message dictionary on the bus. All of these run on the thread that owns the message; they
 /// return false when the message does not take or hold what is asked for, and leave it unusable.
 
-/// Appends `dict` as an `a{sv}`. Text becomes valid UTF-8 without a NUL, U+FFFD in their place.
+/// Appends `dict` as an `a{sv}`, texts as `interchangeText` makes them.
 bool appendDictionary(sd_bus_message* message, const MessageDict& dict);
 
 /// Appends `dict` as a variant that holds an `a{sv}`, or, when it is no dictionary, a string.

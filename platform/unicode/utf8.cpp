@@ -45,19 +45,27 @@ std::size_t asciiLength(std::string_view bytes) {
   return length;
 }
 
-/// How many bytes the code point that starts `bytes` has; 0 when it is ill-formed.
-std::size_t codePointLength(std::string_view bytes) {
-  utf8proc_int32_t codePoint = 0;
+struct CodePoint {
+  std::size_t length = 0;  ///< In bytes; 0 when it is ill-formed.
+  utf8proc_int32_t value = 0;
+};
+
+CodePoint firstCodePoint(std::string_view bytes) {
+  utf8proc_int32_t value = 0;
   const auto length = utf8proc_iterate(reinterpret_cast<const utf8proc_uint8_t*>(bytes.data()),
-                                       static_cast<utf8proc_ssize_t>(bytes.size()), &codePoint);
-  return length > 0 ? static_cast<std::size_t>(length) : 0;
+                                       static_cast<utf8proc_ssize_t>(bytes.size()), &value);
+  return {length > 0 ? static_cast<std::size_t>(length) : 0, value};
+}
+
+bool isNoncharacter(utf8proc_int32_t value) {
+  return (value >= 0xFDD0 && value <= 0xFDEF) || (value & 0xFFFE) == 0xFFFE;
 }
 
 /// How many bytes at the start of `bytes` are well-formed.
 std::size_t validLength(std::string_view bytes) {
   std::size_t length = asciiLength(bytes);
   while (length < bytes.size()) {
-    const auto taken = codePointLength(bytes.substr(length));
+    const auto taken = firstCodePoint(bytes.substr(length)).length;
     if (taken == 0) {
       break;
     }
@@ -84,6 +92,18 @@ std::string validUtf8(std::string_view bytes) {
       text.append(kReplacement);
       bytes.remove_prefix(brokenLength(bytes));
     }
+  }
+  return text;
+}
+
+std::string interchangeText(std::string_view bytes) {
+  const auto valid = validUtf8(bytes);
+  std::string text;
+  text.reserve(valid.size());
+  for (std::string_view rest = valid; !rest.empty();) {
+    const auto [length, value] = firstCodePoint(rest);
+    text.append(value == 0 || isNoncharacter(value) ? kReplacement : rest.substr(0, length));
+    rest.remove_prefix(length);
   }
   return text;
 }

@@ -9,3 +9,7 @@ bool isValidUtf8(std::string_view bytes);
 /// `bytes` as valid UTF-8 (RFC 3629): each broken sequence, as long as it can be read as one,
 /// becomes U+FFFD; well-formed text comes back as it is. From any thread.
 std::string validUtf8(std::string_view bytes);
+
+/// As `validUtf8`, and U+FFFD in place of each NUL and each noncharacter too (Unicode Standard,
+/// chapter 23.7), which not every program takes as text. From any thread.
+std::string interchangeText(std::string_view bytes);

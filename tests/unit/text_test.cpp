@@ -20,6 +20,13 @@ TEST(Utf8, ReplacesEachBrokenSequenceOnce) {
   }
 }
 
+TEST(Utf8, LeavesOutOfInterchangeWhatNotEveryProgramTakes) {
+  EXPECT_EQ(interchangeText(std::string("a\0\xFF|\uFDCF\uFDD0\uFDEF\uFDF0", 16)),
+            "a\uFFFD\uFFFD|\uFDCF\uFFFD\uFFFD\uFDF0");
+  EXPECT_EQ(interchangeText("\uFFFD\uFFFE\uFFFF|\U0001FFFD\U0010FFFF"),
+            "\uFFFD\uFFFD\uFFFD|\U0001FFFD\uFFFD");
+}
+
 TEST(Text, IgnoresTheCaseOfAsciiLettersAlone) {
   EXPECT_TRUE(equalNoCase("Tar.GZ", "tAR.gz"));
   EXPECT_FALSE(equalNoCase("tar", "tar.gz"));
