@@ -34,7 +34,10 @@ ProcessResult SimulatedDevice::runLine(const std::string& line,
 }
 
 ProcessResult SimulatedDevice::runTool(const std::string& words) const {
-  return runLine("exec \"$0\" " + words);
+  auto tool = start({"bash", "-c", "exec \"$0\" " + words, VELLTOOL_PATH});
+  auto result = tool.finish();
+  EXPECT_TRUE(tool.wroteEachLineAtOnce()) << result;
+  return result;
 }
 
 TestProcess SimulatedDevice::serve(const std::string& service) const {

@@ -31,6 +31,7 @@ class SimulatedDevice {
                                       std::vector<std::string> words = {}) const;
 
   /// Runs `velltool` in the device with `words`, which the shell splits, and waits for its end.
+  /// Fails the test when a line was not written before the next one was begun.
   [[nodiscard]] ProcessResult runTool(const std::string& words) const;
 
   /// Starts a service (`bus`, `manager`, `helper`) alone in the device and waits until it can be

@@ -10,6 +10,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <climits>
 #include <csignal>
 #include <fstream>
 #include <sstream>
@@ -22,7 +23,8 @@ namespace {
 /// The end of a new pipe that a process is to have; `testsEnd` is the other one.
 FileDescriptor makePipe(FileDescriptor& testsEnd, bool processReads) {
   int ends[2] = {-1, -1};
-  if (pipe2(ends, O_CLOEXEC) != 0) {
+  // With O_DIRECT, one read gives what one write has written.
+  if (pipe2(ends, O_CLOEXEC | (processReads ? 0 : O_DIRECT)) != 0) {
     throw std::system_error(errno, std::generic_category(), "pipe2");
   }
   testsEnd = FileDescriptor(ends[processReads ? 1 : 0]);
@@ -103,9 +105,12 @@ bool TestProcess::readSome() {
   if (poll(&readable, 1, kPatienceMilliseconds) == 0) {
     giveUp("more output");
   }
-  std::array<char, 4096> buffer{};
+  std::array<char, PIPE_BUF> buffer{};
   const auto count = read(output.get(), buffer.data(), buffer.size());
-  unreadOutput.append(buffer.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+  const std::string_view written(buffer.data(),
+                                 static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+  eachLineAtOnce = eachLineAtOnce && written.find('\n') >= written.size() - 1;
+  unreadOutput.append(written);
   return count > 0;
 }
 

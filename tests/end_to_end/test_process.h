@@ -47,6 +47,9 @@ class TestProcess {
   /// Waits for more standard output and keeps it for the calls that take it. False at the end.
   bool readSome();
 
+  /// Whether each write to standard output so far ended with its first line break, if it had any.
+  [[nodiscard]] bool wroteEachLineAtOnce() const { return eachLineAtOnce; }
+
   void sendSignal(int signalNumber) const;
 
   /// Closes its input and waits for its end. The output is what no earlier call has taken.
@@ -60,6 +63,7 @@ class TestProcess {
   FileDescriptor output;
   FileDescriptor errors;  ///< The file that is its standard error.
   std::string unreadOutput;
+  bool eachLineAtOnce = true;
   pid_t process;
   std::shared_ptr<void> killer;
 };

@@ -89,7 +89,7 @@ End runGroup(Node& place, const Words& words) {
       place = *at == "back" ? above(place) : place;
       return *at == "back" ? End::succeeded : End::leave;
     } else {
-      std::cout << "\nInvalid command option '\x1b[31m" << *at << "\x1b[39m'";
+      std::cout << std::endl << "Invalid command option '\x1b[31m" << *at << "\x1b[39m'";
       return node->displayHelp(), End::failed;
     }
   }
