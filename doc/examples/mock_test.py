@@ -1,0 +1,42 @@
+#!/usr/bin/python3
+"""How a test mocks the manager. Run it on a device without one."""
+
+import os
+import subprocess
+import unittest
+
+import dbus
+import dbusmock
+
+TEMPLATE = os.path.join(os.path.dirname(os.path.abspath(__file__)), "vell_manager.py")
+
+
+def velltool(*words):
+    return subprocess.run(["velltool", "logdump", *words], stdout=subprocess.PIPE,
+                          stderr=subprocess.STDOUT, text=True).stdout
+
+
+class VelltoolTest(dbusmock.DBusTestCase):
+    def setUp(self):
+        process, self.manager = self.spawn_server_template(TEMPLATE, {}, subprocess.DEVNULL)
+        self.addCleanup(process.wait)
+        self.addCleanup(process.terminate)
+        self.mock = dbus.Interface(self.manager, dbusmock.MOCK_IFACE)
+
+    def test_sends_the_reason(self):
+        self.assertIn("/log-bb-T.tar\n", velltool("core", "tar", "why"))
+        _, (command, request) = self.mock.GetMethodCalls("PerformCommand")[-1]
+        self.assertEqual((command, request["BasebandResetReason"]),
+                         ("TraceDumpState", "[velltool] why"))
+
+    def test_says_that_a_collection_has_failed(self):
+        self.mock.Answer("TraceDumpState", 5, dbus.Dictionary(signature="sv"))
+        self.assertEqual(velltool("tel"), "Telephony log collection: Failed\n")
+
+    def test_is_refused_by_a_manager_that_stops(self):
+        self.mock.ChangeServerState("Stopping")
+        self.assertIn("Server is not running", velltool("tel"))
+
+
+if __name__ == "__main__":
+    unittest.main()
