@@ -31,12 +31,16 @@ class MessageDict {
   /// An empty dictionary.
   MessageDict() = default;
 
-  /// What stands for a payload that is no dictionary.
+  /// Stands for a payload that is no dictionary.
   static MessageDict notADictionary();
+
+  /// The dictionary that setting `entries` one by one gives, in time proportional to their number.
+  static MessageDict fromEntries(std::vector<Entry> entries);
 
   [[nodiscard]] bool isDictionary() const { return dictionary; }
 
-  /// Appends an entry, or replaces the value of an entry that has the key, at its place.
+  /// Appends an entry, or replaces the value of the entry that has the key. Takes time proportional
+  /// to the number of entries.
   void set(std::string key, Value value);
 
   /// The string under `key`; `fallback` when there is no such key or it holds another type.

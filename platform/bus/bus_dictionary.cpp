@@ -6,6 +6,7 @@
 #include <cstring>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 namespace {
 
@@ -51,8 +52,8 @@ std::string_view variantContents(sd_bus_message* message) {
   return contents;
 }
 
-/// Reads one entry; `end` tells that there was none left.
-bool readEntry(sd_bus_message* message, MessageDict& dict, bool& end) {
+/// Reads one entry. `end`: there was none left.
+bool readEntry(sd_bus_message* message, std::vector<MessageDict::Entry>& entries, bool& end) {
   const int entered = sd_bus_message_enter_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv");
   end = entered == 0;
   if (entered <= 0) {
@@ -63,7 +64,7 @@ bool readEntry(sd_bus_message* message, MessageDict& dict, bool& end) {
   if (sd_bus_message_read(message, "s", &key) <= 0 || !readValue(message, value)) {
     return false;
   }
-  dict.set(key, std::move(value));
+  entries.push_back({key, std::move(value)});
   return sd_bus_message_exit_container(message) >= 0;
 }
 
@@ -119,11 +120,13 @@ bool readDictionary(sd_bus_message* message, MessageDict& dict) {
   if (sd_bus_message_enter_container(message, SD_BUS_TYPE_ARRAY, "{sv}") <= 0) {
     return false;
   }
+  std::vector<MessageDict::Entry> entries;
   for (bool end = false; !end;) {
-    if (!readEntry(message, dict, end)) {
+    if (!readEntry(message, entries, end)) {
       return false;
     }
   }
+  dict = MessageDict::fromEntries(std::move(entries));
   return sd_bus_message_exit_container(message) >= 0;
 }
 

@@ -3,12 +3,18 @@
 #include <gtest/gtest.h>
 
 TEST(MessageDict, KeepsTheOrderOfItsKeysAndReadsOnlyStringsAsStrings) {
+  const std::vector<MessageDict::Entry> given = {{"b", "text"},
+                                                 {"a", "old"},
+                                                 {"b", "newer"},
+                                                 {"c", true},
+                                                 {"c", false},
+                                                 {"a", std::int64_t{1}},
+                                                 {"d", MessageDict::OtherType{}}};
   MessageDict dict;
-  dict.set("b", "text");
-  dict.set("a", std::int64_t{1});
-  dict.set("c", false);
-  dict.set("b", "newer");
-  dict.set("d", MessageDict::OtherType{});
+  for (const auto& [key, value] : given) {
+    dict.set(key, value);
+  }
+  EXPECT_EQ(MessageDict::fromEntries(given), dict);
   EXPECT_EQ(
       dict.entries(),
       (std::vector<MessageDict::Entry>{
