@@ -20,8 +20,9 @@ namespace vell::client {
 /// a failure.
 class Manager;
 
-/// Called on the work queue for each event. `payload` is what came with the event; `group` is a
-/// group of the library's own that the handler may enter for work that it starts.
+/// Called on the work queue for each event. An event counts only when the connection that owns the
+/// manager's name sent it. `payload` is what came with the event; `group` is a group of the
+/// library's own that the handler may enter for work that it starts.
 using EventHandler = std::function<void(MessageDict payload, WorkGroup group)>;
 
 /// Called once for each asynchronous command, on the work queue, and destroyed right after.
@@ -46,9 +47,9 @@ void EventsOn(std::shared_ptr<Manager> manager);
 void EventsOff(std::shared_ptr<Manager> manager);
 
 /// Sends a command and returns at once. `completion` is called exactly once, whatever happens to
-/// the manager or to the connection; there is no time limit. A command that finds no manager has
-/// the status `kStatusManagerNotRunning`. Text that is not valid UTF-8 or that holds a NUL is sent
-/// with U+FFFD in those places, because the bus carries nothing else.
+/// the manager or to the connection; there is no time limit. A command of which the bus says that
+/// no manager runs has the status `kStatusManagerNotRunning`. Text that is not valid UTF-8 or that
+/// holds a NUL is sent with U+FFFD in those places, because the bus carries nothing else.
 void PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
                     Completion completion, MessageDict request);
 

@@ -25,12 +25,19 @@ constexpr int kMostStepsAtOnce = 64;
 /// What sd_bus_call_async(3) takes for no time limit.
 constexpr std::uint64_t kNoTimeLimit = UINT64_MAX;
 
+/// Whoever owns the destination may answer with these errors too; that says nothing of an owner.
 bool meansNoOwner(sd_bus_message* reply) {
-  return sd_bus_message_is_method_error(reply, SD_BUS_ERROR_SERVICE_UNKNOWN) > 0 ||
-         sd_bus_message_is_method_error(reply, SD_BUS_ERROR_NAME_HAS_NO_OWNER) > 0;
+  return isFrom(reply, kBusDaemon) &&
+         (sd_bus_message_is_method_error(reply, SD_BUS_ERROR_SERVICE_UNKNOWN) > 0 ||
+          sd_bus_message_is_method_error(reply, SD_BUS_ERROR_NAME_HAS_NO_OWNER) > 0);
 }
 
 }  // namespace
+
+bool isFrom(sd_bus_message* message, std::string_view sender) {
+  const char* actual = sd_bus_message_get_sender(message);
+  return actual != nullptr && actual == sender;
+}
 
 BusConnection::BusConnection(const std::string& threadName, Hooks connectionHooks)
     : hooks(std::move(connectionHooks)) {

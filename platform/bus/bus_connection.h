@@ -12,8 +12,17 @@
 #include <mutex>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <thread>
 #include <vector>
+
+/// The bus daemon's own name on the bus. Nobody else can send under it.
+inline constexpr const char* kBusDaemon = "org.freedesktop.DBus";
+
+/// Whether `sender`, a unique name or `kBusDaemon`, sent `message`. The bus daemon sets the sender
+/// of every message. A signal's sender must be checked even when a match rule names it: anyone may
+/// address a signal straight to us, and sd_bus_add_match(3) does not compare well-known names.
+bool isFrom(sd_bus_message* message, std::string_view sender);
 
 /// One call of a method on the bus. The texts are the caller's and outlive the connection.
 struct BusCall {
@@ -28,7 +37,7 @@ struct BusCall {
 /// How a call ended.
 enum class BusOutcome {
   answered,  ///< With a reply that is not an error.
-  noOwner,   ///< Nobody owned the destination, or there was no bus to ask.
+  noOwner,   ///< The bus says that nobody owns the destination, or there was no bus to ask.
   failed,    ///< In any other way.
 };
 

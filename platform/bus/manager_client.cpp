@@ -89,6 +89,12 @@ class Subscriptions {
     return on != nullptr;
   }
 
+  /// Whether `deliver` would call anybody.
+  bool listenTo(const std::string& eventName) const {
+    const std::lock_guard lock(mutex);
+    return on != nullptr && handlers.contains(eventName);
+  }
+
   void deliver(const std::string& eventName, MessageDict payload) const {
     const std::lock_guard lock(mutex);
     const auto found = handlers.find(eventName);
@@ -178,6 +184,7 @@ class vell::client::Manager {
     if (sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr, this) >= 0) {
       ownerChanges.reset(slot);
     }
+    askForOwner();
     openClient();
     if (stateTold) {
       deliverState();
@@ -187,7 +194,23 @@ class vell::client::Manager {
   void onLost() {
     events.reset();
     ownerChanges.reset();
-    subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
+    owner.clear();
+    tellState(kServerStateStopped);
+  }
+
+  /// The bus answers in order: a change of owner that is told before the answer is older than it.
+  void askForOwner() {
+    connection.call(
+        {kBusDaemon, "/org/freedesktop/DBus", kBusDaemon, "GetNameOwner",
+         [](sd_bus_message* message) {
+           return sd_bus_message_append(message, "s", kBusName) >= 0;
+         }},
+        [this](BusOutcome outcome, sd_bus_message* reply) {
+          const char* name = nullptr;
+          if (outcome == BusOutcome::answered && sd_bus_message_read(reply, "s", &name) > 0) {
+            owner = name;
+          }
+        });
   }
 
   void openClient() {
@@ -202,23 +225,33 @@ class vell::client::Manager {
     if (!subscriptions.areOn()) {
       return;
     }
-    connection.call(
-        managerCall("org.freedesktop.DBus.Properties", "Get",
-                    [](sd_bus_message* message) {
-                      return sd_bus_message_append(message, "ss", kInterface, "ServerState") >= 0;
-                    }),
-        [this](BusOutcome outcome, sd_bus_message* reply) {
-          subscriptions.deliver(kEventServerStateChange, stateEvent(readState(outcome, reply)));
-          stateTold = true;
-        });
+    connection.call(managerCall("org.freedesktop.DBus.Properties", "Get",
+                                [](sd_bus_message* message) {
+                                  return sd_bus_message_append(message, "ss", kInterface,
+                                                               "ServerState") >= 0;
+                                }),
+                    [this](BusOutcome outcome, sd_bus_message* reply) {
+                      // A former owner may be late; the state of the new one, or of none, is told
+                      // by then.
+                      if (outcome != BusOutcome::answered || isFrom(reply, owner)) {
+                        tellState(readState(outcome, reply));
+                      }
+                    });
+  }
+
+  void tellState(MessageDict::Value state) {
+    subscriptions.deliver(kEventServerStateChange, stateEvent(std::move(state)));
+    stateTold = true;
   }
 
   static int onEvent(sd_bus_message* signal, void* userdata, sd_bus_error* /*error*/) {
+    auto& manager = *static_cast<Manager*>(userdata);
     const char* name = nullptr;
     MessageDict payload;
-    if (sd_bus_message_has_signature(signal, "sv") > 0 &&
-        sd_bus_message_read(signal, "s", &name) > 0 && readPayload(signal, payload)) {
-      static_cast<Manager*>(userdata)->subscriptions.deliver(name, std::move(payload));
+    if (isFrom(signal, manager.owner) && sd_bus_message_has_signature(signal, "sv") > 0 &&
+        sd_bus_message_read(signal, "s", &name) > 0 && manager.subscriptions.listenTo(name) &&
+        readPayload(signal, payload)) {
+      manager.subscriptions.deliver(name, std::move(payload));
     }
     return 0;
   }
@@ -226,11 +259,13 @@ class vell::client::Manager {
   static int onOwnerChanged(sd_bus_message* signal, void* userdata, sd_bus_error* /*error*/) {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* newOwner = nullptr;
-    if (sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner) <= 0) {
+    if (!isFrom(signal, kBusDaemon) ||
+        sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner) <= 0) {
       return 0;
     }
-    if (*newOwner == '\0') {
-      manager.subscriptions.deliver(kEventServerStateChange, stateEvent(kServerStateStopped));
+    manager.owner = newOwner;
+    if (manager.owner.empty()) {
+      manager.tellState(kServerStateStopped);
     } else {
       manager.openClient();
       manager.deliverState();
@@ -239,7 +274,8 @@ class vell::client::Manager {
   }
 
   const std::string clientName;
-  bool stateTold = false;  // so that a new connection makes it worth telling anew
+  std::string owner;       // unique name of the manager's connection; empty: none that is known
+  bool stateTold = false;  // once it was, a new connection tells it anew
   BusSlotPtr events;
   BusSlotPtr ownerChanges;
 
