@@ -5,6 +5,21 @@
 
 #include <gtest/gtest.h>
 
+StoredEntry message(std::uint64_t realtime, const std::string& text, Fields fields) {
+  fields.emplace_back("MESSAGE", text);
+  return {realtime, std::move(fields)};
+}
+
+std::vector<StoredEntry> entries(std::size_t count, const std::string& text, std::uint64_t start,
+                                 std::size_t oneIn) {
+  std::vector<StoredEntry> made;
+  for (std::size_t at = 0; at < count; ++at) {
+    const auto program = at % oneIn == 0 ? text : "other";
+    made.push_back(message(start + at, program, {{"_EXE", "/usr/bin/" + program}}));
+  }
+  return made;
+}
+
 std::string exportFormat(const std::vector<StoredEntry>& entries) {
   std::string text;
   for (const auto& [realtime, fields] : entries) {
@@ -42,6 +57,15 @@ Export DeviceJournal::run(const std::vector<std::string>& selection, const std::
   EXPECT_EQ(printed + errors, "");
   const bool isFile = std::filesystem::is_regular_file(output());
   return {status, isFile ? contentOf(output()) : "", messages()};
+}
+
+std::string messagesOf(const std::string& content) {
+  std::string messages;
+  for (auto end = content.find('\n'); end != std::string::npos; end = content.find('\n', end + 1)) {
+    const auto start = content.rfind(' ', end) + 1;
+    messages += content.substr(start, end - start) + " ";
+  }
+  return messages;
 }
 
 std::size_t countOf(const std::string& text, const std::string& content) {

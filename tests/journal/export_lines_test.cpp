@@ -11,7 +11,6 @@ namespace {
 
 using namespace std::string_literals;
 
-constexpr std::uint64_t kTime = 1'620'133'641'999'999;
 const std::string kShown = "2021-05-04 13:07:21 +0000 ";
 const std::string kNothing = kShown + "0x00000 0x0 0 (null)((null)):(null) [(null)] ";
 
@@ -41,6 +40,7 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
       {{{"MESSAGE", "odd numbers"}, {"_SOURCE_REALTIME_TIMESTAMP", "soon"}, {"TID", "-1"}, {"_PID", "99999999999"},
         {"SYSLOG_PID", "7 "}, {"VELL_ACTIVITY_ID", "0xFFffFFffFFffFFff"}},
        kShown + "0x174876e7ff 0xffffffffffffffff 0 (null)((null)):(null) [(null)] odd numbers\n"},
+      {{{"MESSAGE", "no date"}, {"_SOURCE_REALTIME_TIMESTAMP", "36028797018963968"}}, kNothing + "no date\n"},
       {{{"MESSAGE", "odd paths"}, {"_EXE", "linkd"}, {"VELL_SENDER_IMAGE_PATH", "/lib/"}},
        kShown + "0x00000 0x0 0 linkd():(null) [(null)] odd paths\n"},
       {{{"MESSAGE", "empty"}, {"_EXE", ""}, {"VELL_SUBSYSTEM", ""}, {"VELL_CATEGORY", ""}},
@@ -57,7 +57,7 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
   std::vector<StoredEntry> entries;
   std::string lines;
   for (const auto& each : cases) {
-    entries.push_back({kTime, each.fields});
+    entries.push_back({kTime + 999'999, each.fields});
     lines += each.line;
   }
   device.store("system.journal", entries);
