@@ -10,7 +10,7 @@
 
 /// Flags of a reader. The reader that ships supports only all of them together.
 inline constexpr unsigned kLogReaderStoredOnly = 1U << 0U;     ///< Ends where the log ended.
-inline constexpr unsigned kLogReaderOldestFirst = 1U << 2U;    ///< By when they were stored.
+inline constexpr unsigned kLogReaderOldestFirst = 1U << 2U;    ///< In the order of being stored.
 inline constexpr unsigned kLogReaderWholeMessages = 1U << 4U;  ///< Texts are never cut off.
 
 /// Why a reader ended.
@@ -73,10 +73,9 @@ class LogReader {
 
   /// Starts delivering and returns at once. To be called once. Delivers the entries whose time is
   /// not before `from` and that are stored when the reading starts, which is presently; none that
-  /// is logged later. They come by when they were stored, oldest first; their own times may differ.
-  /// After the clock was set back in a file, that file's entries come in the order in which they
-  /// stand there. When no thread can be had, the invalidation handler is called at once, on the
-  /// calling thread.
+  /// is logged later. They come in the order of being stored, also when the clock was set back, as
+  /// far as the log tells that order; their own times may differ from it. When no thread can be
+  /// had, the invalidation handler is called at once, on the calling thread.
   void activate(LogTime from);
 
   /// Stops the reader. No handler is called any more, except that one call which has begun, or is

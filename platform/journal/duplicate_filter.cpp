@@ -1,27 +1,16 @@
 #include "platform/journal/duplicate_filter.h"
 
-#include <algorithm>
+#include "platform/journal/journal_place.h"
+
 #include <string_view>
 #include <utility>
 
 namespace {
 
-/// The part "KEY=value" of a cursor, which looks like "s=5f2a...;i=1c3;b=...". Empty without one.
-std::string_view partOf(std::string_view cursor, char key) {
-  while (!cursor.empty()) {
-    const auto part = cursor.substr(0, cursor.find(';'));
-    if (part.starts_with(key)) {
-      return part;
-    }
-    cursor.remove_prefix(std::min(part.size() + 1, cursor.size()));
-  }
-  return {};
-}
-
 std::string partsOf(std::string_view cursor, std::string_view keys) {
   std::string parts;
   for (const auto key : keys) {
-    parts += partOf(cursor, key);
+    parts += cursorPart(cursor, key);
     parts += ';';
   }
   return parts;
@@ -50,7 +39,7 @@ bool DuplicateFilter::isDuplicate(std::uint64_t time, std::string cursor) {
 /// Entries of one sequence are equal when their numbers are: a program may log the same text twice
 /// at one time. Entries of different sequences are equal when boot, times and content hash are.
 bool DuplicateFilter::isKnown(const std::string& cursor) {
-  const std::string sequence(partOf(cursor, 's'));
+  const std::string sequence(cursorPart(cursor, 's'));
   const auto known = sequences.emplace(partsOf(cursor, "bmtx"), sequence).first;
   return known->second != sequence || !places.insert(partsOf(cursor, "si")).second;
 }

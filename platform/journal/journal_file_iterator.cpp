@@ -32,10 +32,8 @@
 #include "platform/journal/journal_file_iterator.h"
 
 #include "platform/journal/lost_pages.h"
-#include "platform/portable/handle.h"
 
 #include <algorithm>
-#include <cstdlib>
 #include <string_view>
 #include <utility>
 
@@ -147,11 +145,7 @@ bool JournalFileIterator::read(EntryBatch& batch) {
 
 std::string JournalFileIterator::cursor() {
   const LostPageWatch watch;
-  char* text = nullptr;
-  if (sd_journal_get_cursor(journal.get(), &text) < 0) {
-    return {};
-  }
-  const HandlePtr<char, std::free> owner(text);
+  auto text = cursorOf(journal.get());
   damaged = damaged || watch.sawLoss();
   return text;
 }

@@ -16,6 +16,9 @@ class JournalFileIterator {
   /// Waits in front of `journalFile`. `from`: the earliest time to start at, in microseconds.
   JournalFileIterator(JournalFile journalFile, std::uint64_t from);
 
+  /// The file, as it was given.
+  [[nodiscard]] const JournalFile& journalFile() const { return file; }
+
   [[nodiscard]] bool isWaiting() const { return state == State::Waiting; }
   [[nodiscard]] bool isClosed() const { return state == State::Closed; }
 
@@ -34,9 +37,6 @@ class JournalFileIterator {
 
   /// When the current entry was stored, in microseconds.
   [[nodiscard]] std::uint64_t realtime() const { return current; }
-
-  /// Whether other files may have entries of the same time as the current one.
-  [[nodiscard]] bool isInOverlap() const { return file.overlap.holds(current); }
 
   /// The cursor of the current entry, see sd_journal_get_cursor(3); empty when that fails. Slow.
   std::string cursor();

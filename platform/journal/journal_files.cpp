@@ -9,7 +9,6 @@
 #include <systemd/sd-id128.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <filesystem>
 #include <set>
@@ -73,18 +72,25 @@ TimeSpan spanOf(sd_journal* journal, bool isLive) {
                                    : TimeSpan{first, isLive ? endOfTime : last};
 }
 
-/// File descriptors that are held back while files are found: however many files there are, some
-/// descriptors are left for the rest of the process.
-class HeldBackDescriptors {
+/// The place of the entry before or behind which a seek has gone.
+std::optional<JournalPlace> placeAfter(sd_journal* journal, int (*step)(sd_journal*)) {
+  return step(journal) > 0 ? JournalPlace::fromCursor(cursorOf(journal)) : std::nullopt;
+}
+
+/// Takes file descriptors that nothing else can have while this lives.
+class SpareDescriptors {
  public:
-  HeldBackDescriptors() {
-    for (auto& one : descriptors) {
-      one = FileDescriptor(open("/dev/null", O_RDONLY | O_CLOEXEC));
+  explicit SpareDescriptors(std::size_t count) {
+    while (descriptors.size() < count) {
+      descriptors.emplace_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
     }
   }
 
+  /// Whether there were as many as wanted.
+  [[nodiscard]] bool isComplete() const { return static_cast<bool>(descriptors.back()); }
+
  private:
-  std::array<FileDescriptor, 8> descriptors;
+  std::vector<FileDescriptor> descriptors;
 };
 
 class Finder {
@@ -127,20 +133,43 @@ class Finder {
       noteUnopened(errno);
     } else if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
       noteFile(path.filename().native(), std::move(file), status.st_size > 0);
+      makeRoom();
     }
   }
 
-  void noteFile(std::string_view name, FileDescriptor file, bool hasContent) {
-    if (const auto journal = openJournal(file.duplicate())) {
-      const bool isLive = isLiveFile(name);
-      const auto stored = spanOf(journal.get(), isLive);
-      if (stored.last >= from) {
-        files.found.push_back({std::move(file), isLive, !name.ends_with('~'), stored, {}});
-      }
-    } else {
+  void noteFile(std::string_view name, FileDescriptor opened, bool hasContent) {
+    const auto journal = openJournal(opened.duplicate());
+    if (!journal) {
       note(errno);
       // An empty file is one that is just being made.
       files.damaged = files.damaged || hasContent;
+      return;
+    }
+    JournalFile file;
+    file.file = std::move(opened);
+    file.isLive = isLiveFile(name);
+    file.wasClosed = !name.ends_with('~');
+    file.stored = spanOf(journal.get(), file.isLive);
+    if (file.stored.last >= from) {
+      sd_journal_seek_head(journal.get());
+      file.first = placeAfter(journal.get(), sd_journal_next);
+      if (!file.isLive) {
+        sd_journal_seek_tail(journal.get());
+        file.last = placeAfter(journal.get(), sd_journal_previous);
+      }
+      files.found.push_back(std::move(file));
+    }
+  }
+
+  /// Gives up the files that end first until there are descriptors for one more file: itself, and
+  /// the second that opening its journal takes.
+  void makeRoom() {
+    while (files.found.size() > 1 && !SpareDescriptors(2).isComplete()) {
+      files.found.erase(std::min_element(files.found.begin(), files.found.end(),
+                                         [](const JournalFile& left, const JournalFile& right) {
+                                           return left.stored.last < right.stored.last;
+                                         }));
+      files.damaged = true;
     }
   }
 
@@ -181,7 +210,9 @@ std::uint64_t journalTime(LogTime time) {
 
 JournalFiles findJournalFiles(std::uint64_t from, std::size_t atMost) {
   raiseFileLimit();
-  const HeldBackDescriptors heldBack;
+  // However many files there are, some descriptors are left for the rest of the process.
+  constexpr std::size_t kHeldBack = 8;
+  const SpareDescriptors heldBack(kHeldBack);
   Finder finder(from, atMost);
   while (finder.findNewFiles()) {
   }

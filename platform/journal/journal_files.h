@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/clock.h"
+#include "platform/journal/journal_place.h"
 #include "platform/portable/handle.h"
 #include "platform/posix/file_descriptor.h"
 
@@ -9,6 +10,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <limits>
+#include <optional>
 #include <vector>
 
 /// Owns an open journal, which one thread opens, uses and closes, see sd-journal(3).
@@ -32,6 +34,8 @@ struct JournalFile {
   bool wasClosed = false;  ///< Whether it was closed in good order, by its name.
   TimeSpan stored;         ///< When its entries were stored. Without end in a live file.
   TimeSpan overlap;        ///< Outside of it, no other file has entries of the same time.
+  std::optional<JournalPlace> first;  ///< Of its first entry, if that can be read.
+  std::optional<JournalPlace> last;   ///< Of its last entry. None in a live file.
 };
 
 /// The device's journal files, by the times of their first entries.
@@ -48,7 +52,9 @@ struct JournalFiles {
 /// Finds the journal files below the sysroot, or the local machine's, as sd_journal_open(3) does:
 /// those of namespaces are not among them. A file that is rotated meanwhile is found under its new
 /// name. Leaves out files that end before `from`, in microseconds. Stops after `atMost` files.
-/// Raises the process's soft limit of open files to the hard limit. From any thread.
+///
+/// Raises the process's soft limit of open files to the hard limit. When there are more files than
+/// that allows, the files that end first are given up, which counts as damage. From any thread.
 JournalFiles findJournalFiles(std::uint64_t from,
                               std::size_t atMost = std::numeric_limits<std::size_t>::max());
 

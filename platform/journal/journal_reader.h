@@ -12,10 +12,11 @@
 #include <functional>
 #include <optional>
 #include <queue>
+#include <utility>
 #include <vector>
 
 /// Reads the selected entries of the device's journal files, from a point in time to what is stored
-/// when the reader is made, and merges them: oldest first across all files, without duplicates. On
+/// when the reader is made, and merges them in the order of being stored, without duplicates. On
 /// one thread.
 class JournalReader {
  public:
@@ -30,10 +31,21 @@ class JournalReader {
   [[nodiscard]] bool isComplete() const { return complete; }
 
  private:
-  /// A file waits for its turn, which comes when its next entry is the oldest.
+  /// A file, and what is known of the files before it.
+  struct Source {
+    explicit Source(JournalFileIterator waiting) : iterator(std::move(waiting)) {}
+
+    JournalFileIterator iterator;
+    std::size_t openPredecessors = 0;  ///< Files that were stored before it and are not closed.
+    std::uint64_t floor = 0;           ///< The latest time that any closed one of them has reached.
+  };
+
+  /// A file waits for its turn, which comes when its next entry is the oldest. Among entries that
+  /// count as being of one time, because the clock was set back, their own times decide.
   struct Turn {
-    std::uint64_t reached = 0;
-    std::size_t file = 0;  ///< Its place in `iterators`.
+    std::uint64_t reached = 0;  ///< Never falls, neither in a file nor from a file to a later one.
+    std::uint64_t reachedInFile = 0;
+    std::size_t file = 0;  ///< Its place in `sources`.
     friend auto operator<=>(const Turn&, const Turn&) = default;
   };
 
@@ -42,13 +54,18 @@ class JournalReader {
   bool isDuplicate();
   void advance(bool selected);
   bool takeTurn();
+  [[nodiscard]] Turn turnOf(std::size_t file) const;
   void waitForTurn(std::size_t file);
+  void end(std::size_t file);
+  bool releaseOne();
+  [[nodiscard]] bool precedes(std::size_t left, std::size_t right) const;
 
   LogSelection selection;
   LogTime start;
-  std::vector<JournalFileIterator> iterators;  ///< One for each file, in the order of the files.
-  std::priority_queue<Turn, std::vector<Turn>, std::greater<>> turns;  ///< The next turn on top.
-  std::optional<std::size_t> current;  ///< The file whose turn it is; it is not in `turns`.
+  std::vector<Source> sources;  ///< One for each file, in the order of the files.
+  /// The next turn on top. Without files that are closed, are current or have open predecessors.
+  std::priority_queue<Turn, std::vector<Turn>, std::greater<>> turns;
+  std::optional<std::size_t> current;  ///< The file whose turn it is.
   DuplicateFilter duplicates;
   bool complete;
 };

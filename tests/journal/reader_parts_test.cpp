@@ -73,22 +73,37 @@ TEST(DuplicateFilter, ComparesSequenceAndNumberOrElseBootTimesAndContent) {
   }
 }
 
+TEST(JournalPlace, GoesByTheSequenceOrElseByTheBoot) {
+  const std::string a(32, 'a');
+  const std::string b(32, 'b');
+  const auto place = [](const std::string& sequence, const std::string& number,
+                        const std::string& boot, const std::string& monotonic) {
+    return JournalPlace::fromCursor("s=" + sequence + ";i=" + number + ";b=" + boot +
+                                    ";m=" + monotonic);
+  };
+  EXPECT_FALSE(place("soon", "1", a, "1") || place(a, "", a, "1") || JournalPlace::fromCursor(""));
+  const auto left = place(a, "9", a, "1f").value();
+  EXPECT_TRUE(isStoredBefore(left, place(a, "a", a, "1e").value()));
+  EXPECT_FALSE(isStoredBefore(left, place(a, "9", a, "ff").value()));
+  EXPECT_TRUE(isStoredBefore(left, place(b, "1", a, "20").value()));
+  EXPECT_FALSE(isStoredBefore(left, place(b, "a", a, "1f").value()));
+  EXPECT_FALSE(isStoredBefore(left, place(b, "a", b, "20").value()));
+}
+
 TEST(JournalFiles, OverlapIsTheSpanThatAFileSharesWithOthers) {
-  const struct {
-    TimeSpan stored, overlap;
-  } cases[] = {{{1, 10}, {4, 10}},
-               {{4, 6}, {4, 6}},
-               {{10, 20}, {10, 20}},
-               {{20, 20}, {20, 20}},
-               {{21, 30}, {}}};
+  const std::pair<TimeSpan, TimeSpan> cases[] = {{{1, 10}, {4, 10}},
+                                                 {{4, 6}, {4, 6}},
+                                                 {{10, 20}, {10, 20}},
+                                                 {{20, 20}, {20, 20}},
+                                                 {{21, 30}, {}}};
   std::vector<JournalFile> files(std::size(cases));
   for (std::size_t at = 0; at < files.size(); ++at) {
-    files[at].stored = cases[at].stored;
+    files[at].stored = cases[at].first;
   }
   findOverlaps(files);
   for (std::size_t at = 0; at < files.size(); ++at) {
-    EXPECT_EQ(files[at].overlap.first, cases[at].overlap.first) << at;
-    EXPECT_EQ(files[at].overlap.last, cases[at].overlap.last) << at;
+    EXPECT_EQ(files[at].overlap.first, cases[at].second.first) << at;
+    EXPECT_EQ(files[at].overlap.last, cases[at].second.last) << at;
   }
 }
 
