@@ -2,20 +2,17 @@
 
 #include "simulator/child_process.h"
 #include "simulator/complaint.h"
+#include "simulator/journal_socket.h"
 
 #include <fcntl.h>
-#include <sys/socket.h>
-#include <sys/un.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
-#include <optional>
 #include <string>
 #include <string_view>
 #include <system_error>
@@ -24,8 +21,6 @@
 namespace simulator {
 
 namespace {
-
-constexpr std::size_t kLargestDatagram = 1U << 18U;
 
 /// A process that stores what is written to the pipe.
 struct StoringProcess {
@@ -71,54 +66,6 @@ bool storeAll(const std::filesystem::path& file, const std::vector<JournalEntry>
   return awaitChild(storing.process) == 0 && written;
 }
 
-/// The socket at `path`, which is reached through its folder because the path of a socket must be
-/// short, see unix(7).
-FileDescriptor listenAt(const std::filesystem::path& path) {
-  const FileDescriptor folder(open(path.parent_path().c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
-  FileDescriptor listening(socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
-  const auto reachable =
-      "/proc/self/fd/" + std::to_string(folder.get()) + "/" + path.filename().string();
-  sockaddr_un address{};
-  address.sun_family = AF_UNIX;
-  reachable.copy(address.sun_path, sizeof address.sun_path - 1);
-  const int on = 1;
-  if (!folder || !listening ||
-      setsockopt(listening.get(), SOL_SOCKET, SO_PASSCRED, &on, sizeof on) != 0 ||
-      bind(listening.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) {
-    complain(path.string() + ": " + std::strerror(errno));
-    return FileDescriptor();
-  }
-  return listening;
-}
-
-/// A datagram and who sent it.
-struct Datagram {
-  std::string bytes;
-  ucred sender{};
-};
-
-std::optional<Datagram> receive(int socket) {
-  Datagram datagram;
-  datagram.bytes.resize(kLargestDatagram);
-  iovec part{datagram.bytes.data(), datagram.bytes.size()};
-  alignas(cmsghdr) std::array<char, CMSG_SPACE(sizeof(ucred))> control{};
-  msghdr message{};
-  message.msg_iov = &part;
-  message.msg_iovlen = 1;
-  message.msg_control = control.data();
-  message.msg_controllen = control.size();
-  const auto size = recvmsg(socket, &message, MSG_CMSG_CLOEXEC);
-  if (size < 0) {
-    return errno == EINTR ? std::optional(Datagram()) : std::nullopt;
-  }
-  datagram.bytes.resize(static_cast<std::size_t>(size));
-  const auto* const header = CMSG_FIRSTHDR(&message);
-  if (header != nullptr && header->cmsg_type == SCM_CREDENTIALS) {
-    std::memcpy(&datagram.sender, CMSG_DATA(header), sizeof datagram.sender);
-  }
-  return datagram;
-}
-
 /// Adds what the journal itself knows of a process, as far as that still can be learned.
 void addSender(JournalEntry& entry, const ucred& sender) {
   const auto process = std::filesystem::path("/proc") / std::to_string(sender.pid);
@@ -152,7 +99,7 @@ std::unique_ptr<Journal> Journal::create(const std::filesystem::path& root,
     complain("the device's journal could not be stored");
     return nullptr;
   }
-  auto listening = listenAt(path);
+  auto listening = listenForLog(path);
   auto storing = startStoring(file);
   if (!listening || storing.process < 0) {
     return nullptr;
@@ -175,7 +122,7 @@ int Journal::run() {
 
 /// Waits for a message and stores it; one that is malformed is dropped.
 bool Journal::storeNext() {
-  const auto datagram = receive(socket.get());
+  const auto datagram = receiveLog(socket.get(), 0);
   if (!datagram) {
     return false;
   }
