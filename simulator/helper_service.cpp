@@ -11,14 +11,14 @@ namespace simulator {
 
 namespace {
 
-constexpr Service::Identity kIdentity = {"org.vell.Helper1", "/org/vell/Helper1",
-                                         "org.vell.Helper1", "Perform", false};
+constexpr Service::Identity kHelperIdentity = {"org.vell.Helper1", "/org/vell/Helper1",
+                                               "org.vell.Helper1", "Perform", false};
 
 }  // namespace
 
 HelperService::HelperService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
                              const RequestLog& log)
-    : device(std::move(describedDevice)), service(kIdentity, std::move(deviceRoot), log) {}
+    : device(std::move(describedDevice)), service(kHelperIdentity, std::move(deviceRoot), log) {}
 
 bool HelperService::connect() {
   static const sd_bus_vtable kVtable[] = {

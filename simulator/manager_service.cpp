@@ -18,14 +18,14 @@ namespace simulator {
 
 namespace {
 
-constexpr Service::Identity kIdentity = {"org.vell.Manager1", "/org/vell/Manager1",
-                                         "org.vell.Manager1", "PerformCommand", true};
+constexpr Service::Identity kManagerIdentity = {"org.vell.Manager1", "/org/vell/Manager1",
+                                                "org.vell.Manager1", "PerformCommand", true};
 
 }  // namespace
 
 ManagerService::ManagerService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
                                const RequestLog& log)
-    : device(std::move(describedDevice)), service(kIdentity, std::move(deviceRoot), log) {}
+    : device(std::move(describedDevice)), service(kManagerIdentity, std::move(deviceRoot), log) {}
 
 bool ManagerService::connect() {
   // A state that is to be no string is an integer on the bus, and says so when it is asked.
@@ -137,8 +137,8 @@ void ManagerService::obey(const std::string& line) {
 
 void ManagerService::sendEvent(const std::string& name, const MessageDict& payload) {
   sd_bus_message* newSignal = nullptr;
-  const int created = sd_bus_message_new_signal(service.connection(), &newSignal, kIdentity.path,
-                                                kIdentity.interface, "Event");
+  const int created = sd_bus_message_new_signal(
+      service.connection(), &newSignal, kManagerIdentity.path, kManagerIdentity.interface, "Event");
   const BusMessagePtr message(newSignal);
   if (created < 0 || !appendText(newSignal, name) || !appendPayload(newSignal, payload) ||
       sd_bus_send(nullptr, newSignal, nullptr) < 0 || sd_bus_flush(service.connection()) < 0) {

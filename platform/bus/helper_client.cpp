@@ -14,9 +14,9 @@
 
 namespace {
 
-constexpr const char* kBusName = "org.vell.Helper1";
-constexpr const char* kObjectPath = "/org/vell/Helper1";
-constexpr const char* kInterface = "org.vell.Helper1";
+constexpr const char* kHelperBusName = "org.vell.Helper1";
+constexpr const char* kHelperPath = "/org/vell/Helper1";
+constexpr const char* kHelperInterface = "org.vell.Helper1";
 
 /// Longest time limit, in milliseconds. Added to the present time it does not overflow.
 constexpr std::int64_t kLongestWait = std::int64_t{1000} * 60 * 60 * 24 * 365;
@@ -42,7 +42,7 @@ class vell::HelperClient::Connection {
                                  const MessageDict& request) {
     const auto promise = std::make_shared<std::promise<BusAnswer>>();
     bus.call(
-        {kBusName, kObjectPath, kInterface, "Perform",
+        {kHelperBusName, kHelperPath, kHelperInterface, "Perform",
          [task, command = std::string(command), request](sd_bus_message* message) {
            return sd_bus_message_append(message, "u", task) >= 0 && appendText(message, command) &&
                   appendDictionary(message, request);

@@ -2,8 +2,8 @@
 
 namespace {
 
-constexpr std::size_t kMostEntries = 256;
-constexpr std::size_t kMostBytes = 256UL * 1024;
+constexpr std::size_t kFullEntries = 256;
+constexpr std::size_t kFullBytes = 256UL * 1024;
 
 }  // namespace
 
@@ -26,14 +26,14 @@ void EntryBatch::dropLast() {
 
 void EntryBatch::clear() {
   bytes.clear();
-  if (bytes.capacity() > 2 * kMostBytes) {
+  if (bytes.capacity() > 2 * kFullBytes) {
     bytes.shrink_to_fit();
   }
   entries.clear();
 }
 
 bool EntryBatch::isFull() const {
-  return entries.size() >= kMostEntries || bytes.size() >= kMostBytes;
+  return entries.size() >= kFullEntries || bytes.size() >= kFullBytes;
 }
 
 std::optional<std::string_view> EntryBatch::valueOf(std::size_t entry, JournalField field) const {

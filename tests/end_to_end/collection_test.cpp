@@ -8,8 +8,6 @@
 
 namespace {
 
-const std::string kFolder = "Path = /private/var/wireless/Library/Logs/Faultkeeper/Baseband/";
-
 /// A profile, words as the shell takes them, and what comes of it: the requests, what is printed,
 /// the status if it is not 0, and what lies there.
 struct Case {
@@ -20,7 +18,7 @@ struct Case {
 
 /// That the collection log-bb-`name` is printed and lies there.
 std::string path(const std::string& name) {
-  return kFolder + "log-bb-" + name + "\nlog-bb-" + name + "\n";
+  return kCollectionPath + "log-bb-" + name + "\nlog-bb-" + name + "\n";
 }
 
 std::string query(const std::string& trace, const std::string& property) {
@@ -44,7 +42,8 @@ std::string dump(const std::string& keys, const std::string& reason, const std::
 
 void expectRuns(const std::string& command, const std::string& profile,
                 const std::vector<Case>& cases) {
-  for (const auto& [ownProfile, words, expected] : cases) {
+  forEachAtOnce(cases, [&](const Case& row) {
+    const auto& [ownProfile, words, expected] = row;
     SCOPED_TRACE(ownProfile + "\n" + words.substr(0, 100));
     // The keys of the case come last, and a later line counts before an earlier one.
     const SimulatedDevice device("RADIO_TYPE=1\nTIMESTAMP=T\n" + profile + ownProfile);
@@ -57,7 +56,7 @@ void expectRuns(const std::string& command, const std::string& profile,
                   (status == 0 ? "" : "status " + std::to_string(status) + "\n") +
                   device.collections(),
               expected);
-  }
+  });
 }
 
 // clang-format off
@@ -80,7 +79,7 @@ std::string baseband(const std::string& mode, const std::string& reason = kByUse
 TEST(Collection, OfTelephonyLogs) {
   const std::string success = "Telephony log collection: Success\n";
   const std::string failure = "Telephony log collection: Failed\n";
-  const std::string open = success + kFolder + "log-bb-T-*\nlog-bb-T-state\nlog-bb-T-telephony\n";
+  const std::string open = success + kCollectionPath + "log-bb-T-*\nlog-bb-T-state\nlog-bb-T-telephony\n";
   const std::string quiet = ", TraceUserConfirmation: b false";
   const std::string longWord(100000, 'x');
   expectRuns("tel", "", {
@@ -137,14 +136,14 @@ TEST(Collection, OfBasebandLogsFromARunningManager) {
        kEnabled + baseband("0") + diag},
       {"Baseband.TraceHighThroughput=yes\n"
        "GET_TRACE_PROPERTY.Baseband.TraceHighThroughput=status:7", "",
-       all + success + kFolder + "log-bb-T-diag\nlog-bb-T-qdss\n"},
+       all + success + kCollectionPath + "log-bb-T-diag\nlog-bb-T-qdss\n"},
       {"Baseband.TraceHighThroughput_TYPE=no-dictionary\nSystemLogs.TraceMode=3", "tar.gz", all + diag},
       {"COMPRESSION_SUPPORTED=no\nDEFAULT_COMPRESSION=tar\nTIMESTAMP=", "",
        all + success + path("-diag")},
       {"TIMESTAMP_TYPE=missing", "TAR", both + baseband("2") + success + path(".tar")},
       {"TIMESTAMP_TYPE=integer\nBaseband.TraceEnabled=' 0x10'", "", all + success + path("-diag")},
       {"TRACE_DUMP_STATE=no-dictionary", "",
-       all + success + kFolder + "log-bb--diag\nlog-bb-T-diag\n"},
+       all + success + kCollectionPath + "log-bb--diag\nlog-bb-T-diag\n"},
       {"TRACE_DUMP_STATE=status:1", "", all + failure},
       {"TRACE_DUMP_STATE=wrong-signature", "", all + failure},
       {"TRACE_DUMP_STATE=die", "", all + failure},

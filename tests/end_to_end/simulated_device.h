@@ -2,9 +2,20 @@
 
 #include "tests/end_to_end/test_process.h"
 
+#include <atomic>
+#include <cstddef>
 #include <filesystem>
+#include <future>
+#include <iterator>
 #include <string>
 #include <vector>
+
+/// The tool's prompt at its root.
+inline const std::string kPrompt = "(/velltool)>> ";
+
+/// What the line starts with that names a collection.
+inline const std::string kCollectionPath =
+    "Path = /private/var/wireless/Library/Logs/Faultkeeper/Baseband/";
 
 /// A simulated device of the test's own, made by vell-simulator, for as long as the object lives.
 class SimulatedDevice {
@@ -54,3 +65,22 @@ class SimulatedDevice {
 
 /// Starts vell-simulator with `words`, which the shell splits; /dev/fd/3 holds `profile`.
 TestProcess startSimulator(const std::string& words, const std::string& profile);
+
+/// Calls `check` with each of `rows`, four at a time: a device takes half a second to start. Throws
+/// what a call throws.
+template <typename Rows, typename Check>
+void forEachAtOnce(const Rows& rows, const Check& check) {
+  std::atomic<std::size_t> next = 0;
+  const auto checkRows = [&] {
+    for (std::size_t row = 0; (row = next++) < std::size(rows);) {
+      check(rows[row]);
+    }
+  };
+  std::vector<std::future<void>> threads;
+  for (int thread = 0; thread < 4; ++thread) {
+    threads.push_back(std::async(std::launch::async, checkRows));
+  }
+  for (auto& thread : threads) {
+    thread.get();
+  }
+}

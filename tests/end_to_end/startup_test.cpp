@@ -10,8 +10,6 @@
 
 namespace {
 
-const std::string kPrompt = "(/velltool)>> ";
-
 std::string rootHelp(const std::string& name) {
   return helpText(name, "\t         logdump  -  [bb|core|oslog|tel]\n\n");
 }
