@@ -63,13 +63,13 @@ TimeSpan spanOf(sd_journal* journal, bool isLive) {
   std::uint64_t first = 0;
   std::uint64_t last = 0;
   const int found = sd_journal_get_cutoff_realtime_usec(journal, &first, &last);
-  if (found == 0) {
+  if (found == 0 && (sd_journal_seek_head(journal) < 0 || sd_journal_next(journal) <= 0)) {
     return {};
   }
   const auto endOfTime = std::numeric_limits<std::uint64_t>::max();
-  // In a file in which the clock was set back, entries may be of any time.
-  return found < 0 || last < first ? TimeSpan{0, endOfTime}
-                                   : TimeSpan{first, isLive ? endOfTime : last};
+  // Entries may be of any time where the clock was set back, or the header is damaged.
+  return found <= 0 || last < first ? TimeSpan{0, endOfTime}
+                                    : TimeSpan{first, isLive ? endOfTime : last};
 }
 
 /// The place of the entry before or behind which a seek has gone.
