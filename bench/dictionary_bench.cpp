@@ -6,6 +6,7 @@
 #include <sys/socket.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
@@ -49,6 +50,7 @@ BusPtr makeBus() {
 /// A message, ready to be read, that holds a dictionary of `count` entries.
 BusMessagePtr makeMessage(sd_bus* bus, int count) {
   std::vector<MessageDict::Entry> entries;
+  entries.reserve(static_cast<std::size_t>(count));
   for (int number = 0; number < count; ++number) {
     entries.push_back({"key number " + std::to_string(number), "some value"});
   }
