@@ -7,6 +7,7 @@
 
 #include <fcntl.h>
 #include <poll.h>
+#include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -18,6 +19,7 @@
 #include <ctime>
 #include <fstream>
 #include <iostream>
+#include <iterator>
 
 namespace simulator {
 
@@ -51,6 +53,11 @@ bool awaitLine(int file) {
   return false;
 }
 
+std::vector<pid_t> children() {
+  std::ifstream list("/proc/thread-self/children");
+  return {std::istream_iterator<pid_t>(list), {}};
+}
+
 }  // namespace
 
 void blockDeviceSignals() {
@@ -63,9 +70,13 @@ Device::Device(const DeviceRoot& deviceRoot)
       managerControl(open((deviceRoot.path() / kManagerControl).c_str(), O_RDWR | O_CLOEXEC)) {
   setenv("VELL_SYSROOT", root.path().c_str(), 1);
   setenv("DBUS_SYSTEM_BUS_ADDRESS", root.busAddress().c_str(), 1);
+  // What the command has started becomes a child of this process when its own parent ends.
+  prctl(PR_SET_CHILD_SUBREAPER, 1);
 }
 
 Device::~Device() {
+  while (endOneOther()) {
+  }
   // The bus goes last, so that no service sees it go and ends in its own way meanwhile.
   for (const bool busItself : {false, true}) {
     for (const auto& [process, name] : services) {
@@ -140,6 +151,17 @@ int Device::run(const std::vector<std::string>& command) {
     }
   }
   return *status;
+}
+
+bool Device::endOneOther() {
+  for (const pid_t child : children()) {
+    if (!services.contains(child)) {
+      kill(child, SIGKILL);
+      awaitChild(child);
+      return true;
+    }
+  }
+  return false;
 }
 
 std::optional<int> Device::reap(pid_t command) {

@@ -15,8 +15,9 @@ class DeviceRoot;
 class DeviceModel;
 
 /// The processes of one simulated device: its bus and its services, as children of this process,
-/// and the command that runs in it. Uses waitpid(2) for any child, and the environment: one object
-/// in a process, with one thread. Everything still running is killed with the object.
+/// and the command that runs in it, with whatever that starts. Uses waitpid(2) for any child, and
+/// the environment: one object in a process, with one thread. Everything still running is killed
+/// with the object.
 class Device {
  public:
   /// Sets the environment for the device at `deviceRoot`, which must outlive this.
@@ -36,6 +37,9 @@ class Device {
 
  private:
   bool startService(const std::string& name);
+
+  /// Kills one child that is no service; false when there is none.
+  bool endOneOther();
 
   /// Collects the children that have ended; gives the exit status of `command` if it has.
   std::optional<int> reap(pid_t command);

@@ -1,6 +1,7 @@
 // The simulated device's entry point: a whole device, or one of its services alone.
 
 #include "platform/device/sysroot.h"
+#include "platform/program.h"
 #include "simulator/complaint.h"
 #include "simulator/device.h"
 #include "simulator/device_root.h"
@@ -113,6 +114,7 @@ int runDevice(const simulator::Options& options) {
 }  // namespace
 
 int main(int count, char** words) {
+  prepareStandardStreams();
   const auto options = simulator::parseOptions({words + (count > 0 ? 1 : 0), words + count});
   if (!options) {
     return kUsageError;

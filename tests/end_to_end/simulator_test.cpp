@@ -44,6 +44,7 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
   expect("-- sh -c 'echo out; echo err >&2; exit 7'", "", {7, "out\n", "err\n"});
   expect("-- sh -c 'kill -KILL $$'", "", {128 + SIGKILL, "", ""});
   expect("-- /no/program", "", {127, "", me + "/no/program: No such file or directory\n"});
+  expect("<&- -- cat", "", {0, "", ""});
   expect("a b", "", {2, "", me + "more than one profile" + usage});
   expect("--help", "", {2, "", me + "\"--help\" is no profile" + usage});
   expect("--", "", {2, "", me + "no command after --" + usage});
@@ -69,7 +70,9 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
 TEST(Simulator, CleansUpHoweverItEnds) {
   for (const int signalNumber : {0, SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     const auto number = std::to_string(signalNumber);
-    const auto line = "kill -" + number + " $PPID; test " + number + " = 0 || exec sleep 60";
+    // What it leaves running would hold its output open.
+    const auto line =
+        "sleep 100 & kill -" + number + " $PPID; test " + number + " = 0 || setsid sleep 100; :";
     auto simulator =
         startSimulator("/dev/fd/3 -- sh -c 'echo \"$VELL_SYSROOT\"; " + line + "'", "JOURNAL=yes");
     const auto root = simulator.readLine();
