@@ -72,7 +72,7 @@ TEST(Simulator, CleansUpHoweverItEnds) {
     const auto number = std::to_string(signalNumber);
     // What it leaves running would hold its output open.
     const auto line =
-        "sleep 100 & kill -" + number + " $PPID; test " + number + " = 0 || setsid sleep 100; :";
+        "setsid sleep 100 & kill -" + number + " $PPID; test " + number + " = 0 || wait";
     auto simulator =
         startSimulator("/dev/fd/3 -- sh -c 'echo \"$VELL_SYSROOT\"; " + line + "'", "JOURNAL=yes");
     const auto root = simulator.readLine();
