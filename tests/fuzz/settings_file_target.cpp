@@ -1,5 +1,5 @@
-// A settings file of any bytes: each line beside what the shell makes of it, the settings written
-// and read again, and the device profile that they make.
+// A settings file of any bytes: each value beside what the shell makes of it, the settings written
+// and read again, and a device profile of them.
 
 #include "platform/device/device_profile.h"
 #include "platform/device/settings_file.h"
@@ -7,10 +7,7 @@
 
 #include <wordexp.h>
 
-#include <algorithm>
-#include <cerrno>
 #include <map>
-#include <regex>
 
 namespace {
 
@@ -21,74 +18,60 @@ std::string shellValue(const std::string& text, const std::string& other) {
     return other;
   }
   wordexp_t words{};
-  require(wordexp(text.c_str(), &words, WRDE_NOCMD) == 0 && words.we_wordc < 2,
-          "no word of the shell");
+  require(wordexp(text.c_str(), &words, WRDE_NOCMD) == 0 && words.we_wordc < 2, "no shell word");
   std::string value = words.we_wordc > 0 ? words.we_wordv[0] : "";
   wordfree(&words);
   return value;
 }
 
-std::string describe(const std::map<std::string, Setting>& settings) {
-  std::string text;
-  for (const auto& [key, setting] : settings) {
-    text += std::to_string(setting.line) + ":" + key + "=[" + setting.value + "]\n";
-  }
-  return text;
-}
-
-/// The settings of `input`; `file` tells which of its lines are faulty.
-std::map<std::string, Setting> model(const std::string& input, SettingsFile file) {
-  static const std::regex setting("([A-Za-z0-9_.]+)=([^]*)");
-  static const std::regex plain("[-+:/,@%^!A-Za-z0-9_.]*");
-  std::map<std::string, Setting> settings;
-  int number = 0;
-  for (auto line : split(input, "\n")) {
-    ++number;
-    line.erase(0, std::min(line.find_first_not_of(" \t\r\v\f"), line.size()));
-    line.erase(line.find_last_not_of(" \t\r\v\f") + 1);
-    const bool fault =
-        std::erase_if(file.faults, [&](auto& each) { return each.line == number; }) > 0;
-    std::smatch match;
-    if (!std::regex_match(line, match, setting)) {
-      require(fault == (!line.empty() && line[0] != '#'), "a fault missed, or none");
-    } else if (fault) {
-      require(!std::regex_match(match.str(2), plain), "a plain value refused");
-      settings.erase(match[1]);
-    } else {
-      // A later line may have the same key.
-      const auto& read = file.settings[match[1]];
-      settings[match[1]] = {read.line == number ? shellValue(match[2], read.value) : "", number};
-    }
-  }
-  require(file.faults.empty(), "a fault of no line");
-  return settings;
-}
-
 }  // namespace
 
 int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+  constexpr const char* kBlanks = " \t\r\v\f";
   const std::string input(data, data + size);
   auto file = SettingsFile::parse(input);
-  requireEqual(describe(file.settings), describe(model(input, file)));
-
-  static const std::regex special("[\"$`\\\\]");
+  const auto lines = split(input, "\n");
   std::string written;
-  for (int line = 0; auto& [key, setting] : file.settings) {
-    written += key + "=\"" + std::regex_replace(setting.value, special, "\\$&") + "\"\n";
-    setting.line = ++line;
+  for (const auto& [key, setting] : file.settings) {
+    auto line = lines.at(static_cast<std::size_t>(setting.line) - 1);
+    line.erase(0, line.find_first_not_of(kBlanks));
+    line.erase(line.find_last_not_of(kBlanks) + 1);
+    require(line.starts_with(key + "="), "another line");
+    requireEqual(setting.value, shellValue(line.substr(key.size() + 1), setting.value));
+    written += key + "=\"";
+    for (const char character : setting.value) {
+      written += std::string("\"$`\\").find(character) == std::string::npos ? "" : "\\";
+      written += character;
+    }
+    written += "\"\n";
   }
   const auto again = SettingsFile::parse(written);
-  requireEqual(describe(again.settings), describe(file.settings));
+  require(again.faults.empty() && again.settings.size() == file.settings.size(), "not read again");
+  for (const auto& [key, setting] : again.settings) {
+    requireEqual(setting.value, file.settings.at(key).value);
+  }
 
-  const auto before = file.faults.size();
-  const auto profile = DeviceProfile::from(file);
-  const auto radio = file.settings["RADIO_TYPE"].value;
-  const auto number = std::strtoll(radio.c_str(), nullptr, 10);
-  const bool good =
-      std::regex_match(radio, std::regex("-?[0-9]+")) && number == static_cast<int>(number);
-  require(profile.radioType == (good ? number : 0), "another radio type");
-  require(profile.internalBuild == (file.settings["INTERNAL_BUILD"].value == "yes"),
-          "another build");
-  require(file.faults.size() <= before + 8, "more faults than keys");
+  // A line by itself gives the same fault, or a setting: the last of its key, unless that is
+  // faulty.
+  std::map<std::string, int> last;
+  auto fault = file.faults.begin();
+  for (int number = 1; const auto& line : lines) {
+    const auto alone = SettingsFile::parse(line);
+    for (const auto& [key, setting] : alone.settings) {
+      last[key] = number;
+    }
+    const bool faulty = fault != file.faults.end() && fault->line == number;
+    require(alone.faults.size() == (faulty ? 1 : 0), "a fault missed, or none");
+    fault += faulty ? 1 : 0;
+    ++number;
+  }
+  require(fault == file.faults.end(), "a fault of no line");
+  for (const auto& [key, number] : last) {
+    const auto found = file.settings.find(key);
+    require(found == file.settings.end() ? !file.faults.empty() && file.faults.back().line > number
+                                         : found->second.line == number,
+            "not the last line of a key");
+  }
+  DeviceProfile::from(file);
   return 0;
 }
