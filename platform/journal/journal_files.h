@@ -27,7 +27,8 @@ struct TimeSpan {
   [[nodiscard]] bool holds(std::uint64_t time) const { return first <= time && time <= last; }
 };
 
-/// One journal file. Held open, so that removing it does not take it away.
+/// One journal file. Held open, so that it is still found when it is renamed. The library opens no
+/// file that is removed.
 struct JournalFile {
   FileDescriptor file;
   bool isLive = false;     ///< Whether entries may still be added to it.
