@@ -94,8 +94,7 @@ bool JournalReader::takeTurn() {
 }
 
 JournalReader::Turn JournalReader::turnOf(std::size_t file) const {
-  const auto& source = sources[file];
-  return {std::max(source.floor, source.iterator.reached()), source.iterator.reached(), file};
+  return {sources[file].iterator.reached(), file};
 }
 
 /// Has a file wait for its turn, unless it has to wait for others first or has no entry left.
@@ -114,12 +113,9 @@ void JournalReader::waitForTurn(std::size_t file) {
 void JournalReader::end(std::size_t file) {
   complete = complete && !sources[file].iterator.isDamaged();
   for (std::size_t other = 0; other < sources.size(); ++other) {
-    auto& source = sources[other];
-    if (source.openPredecessors > 0 && precedes(file, other)) {
-      source.floor = std::max(source.floor, turnOf(file).reached);
-      if (--source.openPredecessors == 0) {
-        waitForTurn(other);
-      }
+    auto& waitsFor = sources[other].openPredecessors;
+    if (waitsFor > 0 && precedes(file, other) && --waitsFor == 0) {
+      waitForTurn(other);
     }
   }
 }

@@ -31,20 +31,17 @@ class JournalReader {
   [[nodiscard]] bool isComplete() const { return complete; }
 
  private:
-  /// A file, and what is known of the files before it.
+  /// A file, and what it has to wait for.
   struct Source {
     explicit Source(JournalFileIterator waiting) : iterator(std::move(waiting)) {}
 
     JournalFileIterator iterator;
     std::size_t openPredecessors = 0;  ///< Files that were stored before it and are not closed.
-    std::uint64_t floor = 0;           ///< The latest time that any closed one of them has reached.
   };
 
-  /// A file waits for its turn, which comes when its next entry is the oldest. Among entries that
-  /// count as being of one time, because the clock was set back, their own times decide.
+  /// A file waits for its turn, which comes when its next entry is the oldest.
   struct Turn {
-    std::uint64_t reached = 0;  ///< Never falls, neither in a file nor from a file to a later one.
-    std::uint64_t reachedInFile = 0;
+    std::uint64_t reached = 0;
     std::size_t file = 0;  ///< Its place in `sources`.
     friend auto operator<=>(const Turn&, const Turn&) = default;
   };

@@ -73,21 +73,24 @@ TEST(ExportFailures, TellWhyThereIsNoJournal) {
 
 TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
   DeviceJournal device;
-  const auto file = storeTenths(device, "system.journal");
-  const auto whole = device.run().content;
-  const auto stored = contentOf(file);
-  // The times of its first and last entry, as the header has them.
-  damage(file, 184, std::string(16, '\0'));
-  EXPECT_EQ(device.run().content, whole);
-
-  std::ofstream(file, std::ios::binary) << stored;
-  const auto size = stored.size();
-  damage(file, size / 8 * 5, randomBytes(size / 8 * 3));
-  const auto part = device.run();
-  EXPECT_LT(part.content.size(), whole.size());
-  EXPECT_EQ(part, (Export{0, whole.substr(0, part.content.size()), kIncomplete}));
-
-  // A whole file beside it is read all the same, and an empty one is none.
+  for (const std::string name : {"system.journal", "system@1.journal"}) {
+    const auto file = storeTenths(device, name);
+    const auto whole = device.run().content;
+    const auto stored = contentOf(file);
+    // The times of its first and last entry, as the header has them.
+    damage(file, 184, std::string(16, '\0'));
+    EXPECT_EQ(device.run().content, whole);
+    const auto size = stored.size() / 8 * 3;
+    for (const auto& bytes : {randomBytes(size), std::string(size, '\0')}) {
+      std::ofstream(file, std::ios::binary) << stored;
+      damage(file, stored.size() / 8 * 5, bytes);
+      const auto part = device.run();
+      EXPECT_LT(part.content.size(), whole.size());
+      EXPECT_EQ(part, (Export{0, whole.substr(0, part.content.size()), kIncomplete}));
+    }
+    fs::remove(file);
+  }
+  // A whole file beside a damaged one is read all the same, and an empty one is none.
   device.store("user-1000.journal", entries(1, "m"));
   change(device, "yes | head -c 9999 >system.journal; touch user-2000.journal");
   EXPECT_EQ(device.run(), (Export{0, kLine, kIncomplete}));
