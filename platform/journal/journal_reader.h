@@ -6,12 +6,12 @@
 #include "platform/journal/journal_file_iterator.h"
 #include "platform/journal/log_selection.h"
 
-#include <compare>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <optional>
 #include <queue>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -43,7 +43,9 @@ class JournalReader {
   struct Turn {
     std::uint64_t reached = 0;
     std::size_t file = 0;  ///< Its place in `sources`.
-    friend auto operator<=>(const Turn&, const Turn&) = default;
+    bool operator>(const Turn& other) const {
+      return std::tie(reached, file) > std::tie(other.reached, other.file);
+    }
   };
 
   bool readEntry(EntryBatch& batch);
