@@ -20,7 +20,7 @@ enum class Conduct {
 struct FaultPlan {
   Conduct conduct = Conduct::Reply;
   bool noDictionary = false;           ///< The reply is something else than a dictionary.
-  std::int32_t status = 0;             ///< Put in place of success.
+  std::int32_t status = 0;             ///< Put in place of success; the reply stays.
   std::chrono::milliseconds delay{0};  ///< How long the request is held before all of the above.
 };
 

@@ -13,16 +13,16 @@ namespace {
 
 using namespace std::chrono_literals;
 
-/// How long to leave a bus alone that could not be reached.
+/// Pause between two attempts to connect.
 constexpr auto kRetryPause = 250ms;
 
-/// How long a bus may take to greet a new connection before it counts as no bus at all.
+/// Time that a bus has to greet a new connection. After that it counts as no bus.
 constexpr auto kGreetingPatience = 5s;
 
-/// How many messages are handled before new calls get their turn.
+/// Messages that are handled before new calls get their turn.
 constexpr int kMostStepsAtOnce = 64;
 
-/// What sd_bus_call_async(3) takes for no time limit.
+/// No time limit, for sd_bus_call_async(3).
 constexpr std::uint64_t kNoTimeLimit = UINT64_MAX;
 
 /// Whoever owns the destination may answer with these errors too; that says nothing of an owner.
@@ -92,7 +92,7 @@ void BusConnection::run() {
   drop();
 }
 
-/// Runs what was handed in; false once the thread is to end.
+/// Runs the posted tasks. Returns false once the thread is to end.
 bool BusConnection::runPosted() {
   std::vector<std::function<void()>> tasks;
   bool ending = false;
@@ -144,7 +144,7 @@ void BusConnection::becomeReady() {
   }
 }
 
-/// Gives the connection up and answers what was under way on it.
+/// Closes the connection and fails every call under way on it.
 void BusConnection::drop() {
   if (!bus) {
     return;
@@ -169,7 +169,7 @@ void BusConnection::drop() {
   }
 }
 
-/// Sends a call now, or once the bus has greeted, or answers it when there is no bus.
+/// Sends a call now, or once the bus has greeted. Without a bus, answers it at once.
 void BusConnection::startCall(BusCall call, ReplyHandler handler) {
   if (!bus && thread.joinable()) {
     connect();
@@ -228,14 +228,14 @@ void BusConnection::finish(std::list<Pending>::iterator pending, sd_bus_message*
   }
 }
 
-/// When the thread has something to do even if nothing happens.
+/// The time at which the thread must run even if no descriptor is ready.
 BusConnection::Clock::time_point BusConnection::wakeTime() const {
   if (!bus) {
     return nextAttempt;
   }
   auto earliest = ready ? Clock::time_point::max() : greetingLimit;
   if (wakeUp.descriptor() < 0) {
-    // Nobody can wake the thread, so that it looks around by itself.
+    // Nothing can wake the thread, so it polls.
     earliest = std::min(earliest, Clock::now() + kRetryPause);
   }
   std::uint64_t busLimit = UINT64_MAX;

@@ -43,10 +43,9 @@ enum class BusOutcome {
 
 /// A connection to the system bus, kept up by a thread of its own, which alone touches it.
 ///
-/// The connection is made at once and, when it cannot be made or is lost, again and again until it
-/// can: at each call and a few times a second. A bus that is slow to greet is waited for once;
-/// after that it counts as no bus until it does greet. See sd_bus_open_system(3) for which bus it
-/// is.
+/// Connects at once to the bus that sd_bus_open_system(3) finds. After a failure or a loss it tries
+/// again at each call and a few times a second. A bus that is slow to greet is waited for once;
+/// after that it counts as no bus until it greets.
 class BusConnection {
  public:
   /// Receives the end of one call, on the connection's thread. `reply` is null unless the outcome
@@ -59,8 +58,7 @@ class BusConnection {
     std::function<void()> lost;                  ///< It is gone; slots on it are to be released.
   };
 
-  /// Starts to connect. `threadName` is for people; either hook may be
-  /// empty.
+  /// Starts to connect. `threadName` is for people; either hook may be empty.
   BusConnection(const std::string& threadName, Hooks hooks);
   BusConnection(const BusConnection&) = delete;
   BusConnection& operator=(const BusConnection&) = delete;
@@ -79,13 +77,13 @@ class BusConnection {
  private:
   using Clock = std::chrono::steady_clock;
 
-  /// A call that is to be sent as soon as the bus has greeted.
+  /// A call to be sent once the bus has greeted.
   struct Waiting {
     BusCall call;
     ReplyHandler handler;
   };
 
-  /// A call that was sent and is not answered yet.
+  /// A call that was sent and not answered yet.
   struct Pending {
     BusConnection* connection;
     ReplyHandler handler;

@@ -10,9 +10,11 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <future>
+#include <memory>
 
 namespace {
 
@@ -41,13 +43,13 @@ class Client : public testing::Test {
     onQueue([&] { EXPECT_EQ(states, expected); });
   }
 
-  /// The status of a command that the manager answers or does not.
+  /// The status of a command.
   std::int32_t ask() {
     MessageDict reply;
     return PerformCommand(manager, vell::kCommandGetTraceProperty, {}, &reply).status;
   }
 
-  /// Has `work` done on the queue and waits for it.
+  /// Runs `work` on the queue and waits for it.
   void onQueue(const std::function<void()>& work) const {
     const auto done = std::make_shared<std::promise<void>>();
     queue.submit([&work, done] { work(), done->set_value(); });
@@ -195,6 +197,22 @@ TEST_F(Client, FollowsOnlyTheOwnerOfTheManagersName) {
   expectStates({"Stopped", "Starting", "Stopped"});
 }
 
+TEST_F(Client, ForgetsTheOwnerWithTheBus) {
+  start("BUS=no");
+  auto bus = std::make_unique<TestProcess>(device->serve("bus"));
+  collectStates();
+  const Stranger owner;
+  owner.takeName();
+  owner.sendEvent("Starting");
+  expectStates({"Stopped", "Starting"});
+  bus.reset();
+  bus = std::make_unique<TestProcess>(device->serve("bus"));
+  EXPECT_EQ(ask(), vell::kStatusManagerNotRunning);
+  const Stranger namesake;  // the new bus counts its connections anew
+  namesake.sendEvent("Started");
+  onQueue([&] { EXPECT_EQ(std::count(states.begin(), states.end(), "Started"), 0); });
+}
+
 TEST_F(Client, TakesOnlyTheBusesWordThatNoManagerRuns) {
   start("MANAGER=absent");
   const Stranger stranger;
@@ -210,7 +228,7 @@ TEST_F(Client, TakesOnlyTheBusesWordThatNoManagerRuns) {
   EXPECT_NE(status, vell::kStatusManagerNotRunning);
 }
 
-TEST_F(Client, AnswersWhatIsOutstandingWhenItGoes) {
+TEST_F(Client, FailsOutstandingRequestsWhenReleased) {
   start("GET_TRACE_PROPERTY=silent");
   std::promise<std::int32_t> answered;
   auto token = std::make_shared<int>();
@@ -240,7 +258,7 @@ TEST_F(Client, StartsNoService) {
             vell::kStatusManagerNotRunning);
 }
 
-TEST_F(Client, OfTheHelperWaitsForAnAnswerWithinItsTimeLimit) {
+TEST_F(Client, WaitsForTheHelperWithinItsTimeLimit) {
   start("HELPER_TIMESTAMP=H\nHELPER_ANSWER=slow:300");
   for (const std::int64_t milliseconds : {60000, 10, 0, -1}) {
     MessageDict request;
