@@ -136,6 +136,39 @@ TEST(Output, EndsTheRunWhenItIsLost) {
   EXPECT_EQ(device.requests().find("SystemLogs"), std::string::npos);
 }
 
+TEST(StartUp, TakesNoSysrootWithRaisedPrivileges) {
+  // That is, in a group that is not the user's own. What id(1) says tells whether that works here.
+  const auto* line = R"(cd "$VELL_SYSROOT" && cp "$0" velltool && cp /usr/bin/id id
+      ./velltool help
+      group=$(id -G | tr ' ' '\n' | grep -vx $(id -g) | head -n 1)
+      test $(id -u) -ne 0 || group=65534
+      chgrp "$group" id velltool && chmod g+s id velltool
+      test $(./id -g) = "$group" && test ! -e /etc/vell/device.conf || exit 77
+      exec ./velltool help)";
+  const auto result = SimulatedDevice("RADIO_TYPE=1\nMANAGER=absent").runLine(line);
+  if (result.status == 77) {
+    GTEST_SKIP() << "No privileges to be raised here, or the machine itself is a device.";
+  }
+  EXPECT_EQ(result, (ProcessResult{255, kStarted.output + kNoRadio.output, ""}));
+}
+
+TEST(StartUp, IsBuiltToBeAttacked) {
+#if defined VELL_SANITIZED || !defined __OPTIMIZE__
+  GTEST_SKIP() << "Built to be looked into.";
+#endif
+  const auto* line = R"(readelf --wide --file-header --segments --dynamic "$0"
+      nm --dynamic "$0"
+      objdump --disassemble "$0" | sed -n 's/or[ql]  *[$]0x0,.*%rsp.*/probed stack/p')";
+  const auto output = TestProcess({"sh", "-c", line, VELLTOOL_PATH}).finish().output;
+  for (const auto* part : {"DYN (Position-Independent Executable", "GNU_RELRO", "BIND_NOW",
+                           "NOW PIE", "__stack_chk_fail", "printf_chk@"}) {
+    EXPECT_NE(output.find(part), std::string::npos) << part;
+  }
+#if defined __x86_64__ && !defined __clang__
+  EXPECT_NE(output.find("probed stack"), std::string::npos);
+#endif
+}
+
 TEST(StartUp, ExportsItsInterfaceAndNothingElse) {
 #ifdef VELL_SANITIZED
   GTEST_SKIP() << "A sanitizer has the linker export everything.";
