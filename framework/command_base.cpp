@@ -61,6 +61,17 @@ bool CommandBase::isValidCommand(std::string word) const {
   return handlers.contains(word);
 }
 
+std::set<std::string> CommandBase::getWords() const {
+  std::set<std::string> words;
+  for (const auto& [word, handler] : handlers) {
+    words.insert(word);
+  }
+  for (const auto& [word, child] : subCommands) {
+    words.insert(word);
+  }
+  return words;
+}
+
 std::string CommandBase::getHierarchy() const {
   return hierarchyPath;
 }

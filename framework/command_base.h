@@ -6,6 +6,7 @@
 #include <list>
 #include <map>
 #include <memory>
+#include <set>
 #include <string>
 
 /// What a handler word runs. It receives the group that was made for this one call, to enter for
@@ -57,6 +58,9 @@ class CommandBase : public std::enable_shared_from_this<CommandBase> {
 
   /// Whether a handler is registered under `word`.
   bool isValidCommand(std::string word) const;
+
+  /// The words of all handlers and children.
+  std::set<std::string> getWords() const;
 
   /// The names from the root to this node, each after a "/"; empty before `init`.
   std::string getHierarchy() const;

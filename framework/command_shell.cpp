@@ -1,24 +1,12 @@
 #include "framework/command_shell.h"
 
+#include "framework/command_path.h"
+#include "framework/completion.h"
 #include "framework/terminal_colour.h"
+#include "platform/line_reader.h"
 
-#include <algorithm>
 #include <iostream>
-#include <sstream>
 #include <utility>
-
-namespace {
-
-std::list<std::string> splitAtWhiteSpace(const std::string& line) {
-  std::list<std::string> words;
-  std::istringstream stream(line);
-  for (std::string word; stream >> word;) {
-    words.push_back(word);
-  }
-  return words;
-}
-
-}  // namespace
 
 CommandShell::~CommandShell() = default;
 
@@ -43,16 +31,13 @@ bool CommandShell::run(std::list<std::string> words) {
 }
 
 bool CommandShell::readInteractively() {
-  while (true) {
-    std::cout << "(" << promptNode->getHierarchy() << ")>> " << std::flush;
-    std::string line;
-    if (!std::cout || !std::getline(std::cin, line)) {
-      return false;
-    }
-    if (executeGroups(splitCommandGroups(splitAtWhiteSpace(line))) == GroupEnd::leave) {
+  const auto complete = [this](const std::string& text) { return completeLine(promptNode, text); };
+  while (const auto line = readLine("(" + promptNode->getHierarchy() + ")>> ", complete)) {
+    if (executeGroups(splitCommandGroups(splitAtWhiteSpace(*line))) == GroupEnd::leave) {
       return true;
     }
   }
+  return false;
 }
 
 std::vector<std::list<std::string>> CommandShell::splitCommandGroups(
@@ -144,23 +129,9 @@ bool CommandShell::enterSubCommand(const std::string& word) {
 }
 
 bool CommandShell::changeNode(const std::list<std::string>& operands) {
-  if (operands.size() != 1) {
+  if (operands.size() != 1 || !followPath(currentNode, operands.front())) {
     currentNode->displayHelp();
     return false;
-  }
-  auto path = operands.front();
-  std::replace(path.begin(), path.end(), '/', ' ');
-  for (const auto& step : splitAtWhiteSpace(path)) {
-    if (currentNode->isValidSubCommand(step)) {
-      currentNode = currentNode->getSubCommandObj(step);
-    } else if (step == "..") {
-      if (const auto parent = currentNode->getParent().lock()) {
-        currentNode = parent;
-      }
-    } else {
-      currentNode->displayHelp();
-      return false;
-    }
   }
   if (promptNode) {
     promptNode = currentNode;

@@ -3,10 +3,10 @@
 set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")/.."
 
-build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev)
+build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev libedit-dev)
 run_packages=(dbus-daemon systemd-journal-remote)
 check_packages=(libgtest-dev clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev mandoc
-  python3-dbusmock zsh)
+  python3-dbusmock tmux zsh)
 
 say() {
   printf '\n== %s\n' "$*"

@@ -1,0 +1,64 @@
+#include "framework/completion.h"
+
+#include "framework/command_path.h"
+
+#include <set>
+
+namespace {
+
+enum class Next { firstWord, laterWord, path };
+
+/// What can follow at `node`. Not all words of a tree can be typed.
+std::set<std::string> wordsAt(const CommandBase& node, Next next) {
+  std::set<std::string> words = node.getWords();
+  std::erase_if(words, [&](const std::string& word) {
+    return word == "--" || splitAtWhiteSpace(word) != std::list<std::string>{word} ||
+           (next == Next::path && (!node.isValidSubCommand(word) || word.find('/') != word.npos));
+  });
+  if (next != Next::path) {
+    words.insert({"cd", "help"});
+  }
+  if (next == Next::firstWord) {
+    words.insert({"quit", "exit"});
+  }
+  if (next != Next::laterWord && !node.getParent().expired()) {
+    words.insert(next == Next::path ? ".." : "back");
+  }
+  return words;
+}
+
+}  // namespace
+
+Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const std::string& text) {
+  auto words = splitAtWhiteSpace(text);
+  std::string typed;
+  if (!words.empty() && text.ends_with(words.back())) {
+    typed = words.back();
+    words.pop_back();
+  }
+  auto node = promptNode;  // Null behind the words of a handler, and of nothing.
+  auto next = Next::firstWord;
+  for (const auto& word : words) {
+    if (word == "--") {
+      node = promptNode;
+      next = Next::firstWord;
+    } else if (node && next != Next::path && word == "cd") {
+      next = Next::path;
+    } else if (node) {
+      const bool ends = next == Next::path || node->isValidCommand(word);
+      node = ends ? nullptr : node->getSubCommandObj(word);
+      next = Next::laterWord;
+    }
+  }
+  if (const auto slash = typed.rfind('/'); node && next == Next::path && slash != typed.npos) {
+    node = followPath(node, typed.substr(0, slash)) ? node : nullptr;
+    typed.erase(0, slash + 1);
+  }
+  Completions completions{typed.size(), {}};
+  for (const auto& word : node ? wordsAt(*node, next) : std::set<std::string>()) {
+    if (word.starts_with(typed)) {
+      completions.words.push_back(word + (next == Next::path ? "/" : " "));
+    }
+  }
+  return completions;
+}

@@ -1,0 +1,175 @@
+// The interactive shell on a terminal, as it looks to a person.
+
+#include "tests/end_to_end/simulated_device.h"
+
+#include <gtest/gtest.h>
+
+#include <csignal>
+#include <list>
+
+namespace {
+
+const auto kSearchPath = "PATH=" + std::filesystem::path(VELLTOOL_PATH).parent_path().string() +
+                         ":" + std::getenv("PATH");
+
+/// A terminal that tmux makes, and bash in the root of a device on it.
+class Screen {
+ public:
+  explicit Screen(const SimulatedDevice& device)
+      : tmux(device.start({kSearchPath, "tmux", "-S", device.root() / "tmux", "-f", "/dev/null",
+                           "-C", "new-session", "-x80", "-y50",
+                           "cd $VELL_SYSROOT; stty -g >stty; PS1='$ ' exec bash --norc"})) {
+    tmux.readUntil("%end ");
+    command("set-option destroy-unattached on");
+    expect("$ ");
+  }
+
+  /// Strikes keys: tmux's names of them, and words in quotes.
+  void type(const std::string& keys) { command("send-keys " + keys); }
+
+  void startTool() {
+    type("'clear; velltool' Enter");
+    expect(kPrompt);
+  }
+
+  void resize(int columns) {
+    command("clear-history");
+    command("resize-window -y50 -x" + std::to_string(columns));
+  }
+
+  /// Waits until `rows` are on the screen: up to the last that is not blank.
+  void expect(const std::string& rows) {
+    constexpr int kLooks = 400;
+    std::string shown = capture();
+    for (int look = 0; look < kLooks && shown != rows; ++look) {
+      command("run-shell 'sleep 0.05'");
+      shown = capture();
+    }
+    EXPECT_EQ(shown, rows);
+  }
+
+  /// What tmux answers in its control mode.
+  std::string command(const std::string& words) {
+    const std::string end = "%end ";
+    tmux.write(words + "\n");
+    tmux.readUntil("%begin");
+    tmux.readLine();
+    const auto answer = tmux.readUntil(end);
+    return answer.substr(0, answer.size() - end.size());
+  }
+
+ private:
+  /// tmux leaves out the blanks at the end of a row; the last one has that of its prompt.
+  std::string capture() {
+    auto rows = command("capture-pane -p");
+    rows.erase(rows.find_last_not_of('\n') + 1);
+    return rows.ends_with("$") || rows.ends_with(">>") ? rows + " " : rows;
+  }
+
+  TestProcess tmux;
+};
+
+}  // namespace
+
+// clang-format off
+
+TEST(LineEditing, ShowsWhatIsTyped) {
+  const SimulatedDevice device("RADIO_TYPE=1");
+  Screen screen(device);
+  screen.startTool();
+  const std::pair<const char*, std::string> cases[] = {
+      {"acd Left Left b '|'", "ab|cd"},
+      {"xab Home DC End '|'", "ab|"},
+      {"-- Enter '-- --' Enter z Up Up Up Down '|'", "--\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
+      {"hä漢字é Left Left '|'", "hä漢|字é"},
+      {"xe\u0301か\u3099 Left '|'", "xe\u0301|か\u3099"},
+      {"xe\u0301か\u3099\u0301y Left BSpace BSpace '|'", "x|y"},
+      {"\u0301a '|'", "a|"},
+      {"lo Tab te Tab '|'", "logdump tel |"},
+      {"'tel -- cd ' Tab '|'", "tel -- cd logdump/|"},
+      {"'logdump  ' Tab '|'", "logdump  |"},
+      {"'logdump ' Tab Tab '|'", "logdump\nbb  cd  core  help  oslog  tel\n" + kPrompt + "logdump |"},
+      {"'logdump tel ' Tab Tab '|'", "logdump tel |"},
+  };
+  for (const auto& [keys, shown] : cases) {
+    screen.type(std::string("C-u C-l ") + keys);
+    screen.expect(kPrompt + shown);
+  }
+  const std::string line = "the line is longer than the window, 漢字漢字";
+  screen.type("C-u C-l '" + line + "' Left Left");
+  screen.expect(kPrompt + line);
+  screen.resize(29);
+  screen.type("'|'");
+  screen.expect("(/velltool)>> the line is lon\nger than the window, 漢字|漢\n字");
+}
+
+TEST(LineEditing, LeavesTheTerminalAsItWas) {
+  const SimulatedDevice device("RADIO_TYPE=1");
+  Screen screen(device);
+  const auto shell = std::to_string(std::stoi(screen.command("display-message -p '#{pane_pid}'")));
+  const struct {
+    std::string keys;
+    int signal;
+    std::string shown;
+    int status;
+  } cases[] = {{"C-u C-d", 0, "", 1},
+               {"t Enter", 0, "quit\n", 0},
+               {"C-c", 0, "qui\n", 130},
+               {"", SIGTERM, "quiTerminated\n", 143},
+               {"", SIGHUP, "quiHangup\n", 129},
+               {"", SIGABRT, "quiAborted\n", 134},
+               {"C-z", 0, "qui\n[1]+  Stopped                 velltool\n", 148}};
+  for (const auto& [keys, signal, shown, status] : cases) {
+    SCOPED_TRACE(keys + std::to_string(signal));
+    screen.startTool();
+    screen.type("qui");
+    screen.expect(kPrompt + "qui");
+    screen.type(keys);
+    if (signal != 0) {
+      kill(std::stoi(contentOf("/proc/" + shell + "/task/" + shell + "/children")), signal);
+    }
+    screen.expect(kPrompt + shown + "$ ");
+    screen.type("'e=$?; clear; echo $e $(stty -g | cmp - stty)' Enter");
+    screen.expect(std::to_string(status) + "\n$ ");
+  }
+  const auto continued = "148\n$ fg\nvelltool\n" + kPrompt;
+  screen.type("fg Enter");
+  screen.expect(continued + "qui");
+  screen.type("t Enter");
+  screen.expect(continued + "quit\n$ ");
+}
+
+TEST(LineEditing, ShowsWhatIsTypedAheadAtTheNextPrompt) {
+  const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent\nTIMESTAMP=T\nTRACE_DUMP_STATE=slow:1000");
+  auto manager = device.serve("manager");
+  Screen screen(device);
+  screen.startTool();
+  screen.type("'logdump tel' Enter");
+  manager.readUntil("TraceDumpState");
+  screen.type("'cd logdump' Enter te Tab '|'");
+  screen.expect(kPrompt + "logdump tel\nTelephony log collection: Success\nPath = "
+                "/private/var/wireless/Library/Logs/Faultkeeper/Baseband/log-bb-T-*\n" +
+                kPrompt + "cd logdump\n(/velltool/logdump)>> tel |");
+}
+
+TEST(LineEditing, GivesWhatLinesFromAPipeGive) {
+  const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
+  const std::list<std::string> lines = {"logdump bb", "-- nosuch -- help", "cd logdump", "tel", "cd .. -- cd x", "quit"};
+  std::string input, keys;
+  for (const auto& line : lines) {
+    input += line + "\n";
+    keys += " '" + line + "' Enter";
+  }
+  const auto* const piped = R"(export "$1"; velltool <<< "$2" 2>&1 | expand | sed $'s/\e[^m]*m//g')";
+  auto expected = device.runLine(piped, {kSearchPath, input}).output;
+  // A terminal shows each line behind its prompt.
+  std::size_t prompt = 0;
+  for (const auto& line : lines) {
+    prompt = expected.find(">> ", prompt) + 3;
+    expected.insert(prompt, line + "\n");
+  }
+  Screen screen(device);
+  screen.startTool();
+  screen.type(keys);
+  screen.expect(expected + "$ ");
+}
