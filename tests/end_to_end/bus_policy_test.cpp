@@ -14,7 +14,9 @@ namespace {
 /// What $user ("root" or "nobody") may do on the bus: a word for each call that succeeds. Sends the
 /// signals to the connection $1.
 const char* const kAttempts = R"(
-    bus() { setpriv --reuid="$user" --clear-groups busctl --address="$DBUS_SYSTEM_BUS_ADDRESS" "$@"; }
+    bus() {
+      setpriv --reuid="$user" --clear-groups busctl --address="$DBUS_SYSTEM_BUS_ADDRESS" "$@"
+    }
     manager='org.vell.Manager1 /org/vell/Manager1'
     helper='org.vell.Helper1 /org/vell/Helper1'
     {

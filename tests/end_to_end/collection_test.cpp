@@ -59,29 +59,33 @@ void expectRuns(const std::string& command, const std::string& profile,
   });
 }
 
-// clang-format off
-
 std::string telephony(const std::string& mode, const std::string& reason = kByUser) {
-  return kMode + dump("TraceAction: s \"CollectTelephonyLogs\", TraceDumpStateReason", reason, mode);
+  return kMode +
+         dump("TraceAction: s \"CollectTelephonyLogs\", TraceDumpStateReason", reason, mode);
 }
 
 std::string core(const std::string& mode, const std::string& reason = kByUser) {
-  return dump("BasebandResetType: s \"Hard\", BasebandResetSubType: s \"OtherErrors\", "
-              "TraceAction: s \"CollectTelephonyLogsWithCoredump\", BasebandResetReason", reason, mode);
+  return dump(
+      "BasebandResetType: s \"Hard\", BasebandResetSubType: s \"OtherErrors\", "
+      "TraceAction: s \"CollectTelephonyLogsWithCoredump\", BasebandResetReason",
+      reason, mode);
 }
 
 std::string baseband(const std::string& mode, const std::string& reason = kByUser) {
-  return kMode + dump("TraceDumpStateReason", reason, mode, "TraceAction: s \"CollectBasebandLogs\", ");
+  return kMode +
+         dump("TraceDumpStateReason", reason, mode, "TraceAction: s \"CollectBasebandLogs\", ");
 }
 
 }  // namespace
 
-TEST(Collection, OfTelephonyLogs) {
+TEST(Collection, TelTableOfOutcomes) {
   const std::string success = "Telephony log collection: Success\n";
   const std::string failure = "Telephony log collection: Failed\n";
-  const std::string open = success + kCollectionPath + "log-bb-T-*\nlog-bb-T-state\nlog-bb-T-telephony\n";
+  const std::string open =
+      success + kCollectionPath + "log-bb-T-*\nlog-bb-T-state\nlog-bb-T-telephony\n";
   const std::string quiet = ", TraceUserConfirmation: b false";
   const std::string longWord(100000, 'x');
+  // clang-format off
   expectRuns("tel", "", {
       {"", "", telephony("0") + open},
       {"", "Tar.Gz nonui my tar", telephony("1" + quiet, "my") + success + path("T.tar.gz")},
@@ -104,11 +108,13 @@ TEST(Collection, OfTelephonyLogs) {
       {"", "$'a\xFF\xC3z\n'", telephony("0", "a\xEF\xBF\xBD\xEF\xBF\xBDz\n") + open},
       {"", longWord + " ''", telephony("0", longWord) + open},
   });
+  // clang-format on
 }
 
-TEST(Collection, OfTelephonyLogsWithACoreDump) {
+TEST(Collection, CoreTableOfOutcomes) {
   const std::string title = "Telephony log collection with Coredump: ";
   const std::string success = title + "Success\n";
+  // clang-format off
   expectRuns("core", "DEFAULT_COMPRESSION=tar.gz\nSystemLogs.TraceMode=3\n", {
       {"", "'' tar", core("1", "") + success + path("T.tar.gz")},
       {"", "nocompress", core("0") + success + path("T-cd") + "log-bb-T-telephony\n"},
@@ -117,16 +123,19 @@ TEST(Collection, OfTelephonyLogsWithACoreDump) {
        "log-bb-T-telephony\n"},
       {"TRACE_DUMP_STATE=status:-2147483648", "", core("1") + title + "Failed\n"},
   });
+  // clang-format on
 }
 
-TEST(Collection, OfBasebandLogsFromARunningManager) {
+TEST(Collection, BbTableOfOutcomesWithARunningManager) {
   const std::string success = "Baseband log collection: Success (Vell running)\n";
   const std::string failure = "Baseband log collection: Failed\n";
   const std::string off = "Baseband logs are not enabled\n";
   const std::string both = kEnabled + kHighThroughput;
   const std::string all = both + baseband("0");
   const std::string diag = success + path("T-diag");
-  expectRuns("bb", "RADIO_DIAG_QDSS=yes\nBaseband.TraceEnabled=yes\nBaseband.TraceHighThroughput=no\n", {
+  // clang-format off
+  expectRuns("bb",
+      "RADIO_DIAG_QDSS=yes\nBaseband.TraceEnabled=yes\nBaseband.TraceHighThroughput=no\n", {
       // The state of the server does not matter to this command.
       {"SERVER_STATE=Starting", "", all + diag},
       {"Baseband.TraceHighThroughput=LITE", "nonui why tar",
@@ -137,7 +146,8 @@ TEST(Collection, OfBasebandLogsFromARunningManager) {
       {"Baseband.TraceHighThroughput=yes\n"
        "GET_TRACE_PROPERTY.Baseband.TraceHighThroughput=status:7", "",
        all + success + kCollectionPath + "log-bb-T-diag\nlog-bb-T-qdss\n"},
-      {"Baseband.TraceHighThroughput_TYPE=no-dictionary\nSystemLogs.TraceMode=3", "tar.gz", all + diag},
+      {"Baseband.TraceHighThroughput_TYPE=no-dictionary\nSystemLogs.TraceMode=3", "tar.gz",
+       all + diag},
       {"COMPRESSION_SUPPORTED=no\nDEFAULT_COMPRESSION=tar\nTIMESTAMP=", "",
        all + success + path("-diag")},
       {"TIMESTAMP_TYPE=missing", "TAR", both + baseband("2") + success + path(".tar")},
@@ -155,14 +165,16 @@ TEST(Collection, OfBasebandLogsFromARunningManager) {
       {"GET_TRACE_PROPERTY=wrong-signature", "", kEnabled + failure + "status 1\n"},
       {"GET_TRACE_PROPERTY=die", "", kEnabled + failure + "status 1\n"},
   });
+  // clang-format on
 }
 
-TEST(Collection, OfBasebandLogsThatAManagerLeftBehind) {
+TEST(Collection, BbTableOfOutcomesWithoutAManager) {
   const std::string success = "Baseband log collection: Success (Vell not running)\n";
   const std::string live = success + "Path = /private/var/wireless/Library/Logs/VellManager/";
   const std::string scratch = live + "DIAG.scratch\n";
   const std::string snapshot = kHelper + success + path("H-diag");
   const std::string both = kEnabled + kHighThroughput;
+  // clang-format off
   expectRuns("bb",
       "MANAGER=absent\nINTERNAL_BUILD=yes\nRADIO_DIAG_QDSS=yes\nHELPER_TIMESTAMP=H\n"
       "Baseband.TraceEnabled=yes\nBaseband.TraceHighThroughput=no\n", {
@@ -188,6 +200,5 @@ TEST(Collection, OfBasebandLogsThatAManagerLeftBehind) {
       {"MANAGER=running\nGET_TRACE_PROPERTY.Baseband.TraceHighThroughput=die", "", both + snapshot},
       {"MANAGER=running\nGET_TRACE_PROPERTY.SystemLogs.TraceMode=die", "", both + kMode + snapshot},
   });
+  // clang-format on
 }
-
-// clang-format on

@@ -60,7 +60,7 @@ TEST(ManagerLife, ToolRefusesCommandsWhileNoManagerRuns) {
   }
 }
 
-TEST(ManagerLife, IsFollowedThroughStartsAndStops) {
+TEST(ManagerLife, ToolFollowsStartsAndStops) {
   const SimulatedDevice device(
       "RADIO_TYPE=1\nMANAGER=absent\nTIMESTAMP=T\n"
       "TRACE_DUMP_STATE.CollectTelephonyLogsWithCoredump=silent\n");
@@ -88,7 +88,7 @@ TEST(ManagerLife, IsFollowedThroughStartsAndStops) {
   EXPECT_EQ(tool.finish().status, 0);
 }
 
-TEST(ManagerLife, OutlastsTheLossOfTheBus) {
+TEST(ManagerLife, ToolOutlastsTheLossOfTheBus) {
   const SimulatedDevice device(
       "RADIO_TYPE=1\nBUS=no\nTIMESTAMP=T\nBaseband.TraceEnabled=yes\nTRACE_DUMP_STATE=silent\n"
       "TRACE_DUMP_STATE.CollectTelephonyLogs=answer\n");
@@ -105,7 +105,7 @@ TEST(ManagerLife, OutlastsTheLossOfTheBus) {
   }
 }
 
-TEST(ManagerLife, IsNotWaitedForOnABusThatLeadsNowhereOrNeverGreets) {
+TEST(ManagerLife, OnlyOneRequestWaitsForABusThatNeverGreets) {
   const SimulatedDevice device("RADIO_TYPE=1\nBUS=no\nBaseband.TraceEnabled=yes");
   const auto bus = device.serve("bus");
   bus.sendSignal(SIGSTOP);
@@ -131,7 +131,7 @@ TEST(ManagerLife, TwoToolsWaitForAnAnswerLongerThanTheBusLibraryWould) {
       (ProcessResult{0, kCore + "Success\n" + kCollectionPath + "log-bb-T-cd\n" + kCollected, ""}));
 }
 
-TEST(SavedTraces, CountAsNoneWhenTheyCannotBeRead) {
+TEST(SavedTraces, CountAsNoneWhenUnreadable) {
   const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
   SystemLogSocket log(device.root());
   const auto settings = device.root() / "var/lib/vell/traces.conf";

@@ -6,7 +6,7 @@
 
 #include <csignal>
 
-TEST(Simulator, HasAJournalThatTakesWhatIsLogged) {
+TEST(Simulator, JournalTakesWhatIsLogged) {
   const SimulatedDevice device("RADIO_TYPE=1\nJOURNAL=yes");
   const auto* line = R"(cd "$VELL_SYSROOT"
       "$0" logdump oslog 3600 out && cut -d' ' -f7 out | LC_ALL=C sort -u | xargs
@@ -30,9 +30,7 @@ TEST(Simulator, HasAJournalThatTakesWhatIsLogged) {
   EXPECT_EQ(device.runLine(line), (ProcessResult{0, expected, ""}));
 }
 
-// clang-format off
-
-TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
+TEST(Simulator, ExitsWithItsCommandsStatusOrRefusesBadInput) {
   const std::string me = "vell-simulator: ";
   const std::string at = me + "/dev/fd/3:";
   const std::string usage =
@@ -41,6 +39,7 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
   const auto expect = [](const auto* words, const auto* profile, const ProcessResult& result) {
     EXPECT_EQ(startSimulator(words, profile).finish(), result);
   };
+  // clang-format off
   expect("-- sh -c 'echo out; echo err >&2; exit 7'", "", {7, "out\n", "err\n"});
   expect("-- sh -c 'kill -KILL $$'", "", {128 + SIGKILL, "", ""});
   expect("-- /no/program", "", {127, "", me + "/no/program: No such file or directory\n"});
@@ -52,7 +51,8 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
   expect("--serve", "", {2, "", me + "--serve takes a service and perhaps a file" + usage});
   expect("--serve manager", "", {1, "", me + "--serve works inside a simulated device only\n"});
   expect("/no/file -- true", "", {1, "", me + "/no/file: No such file or directory\n"});
-  expect("/dev/fd/3 -- true", "JOURNAL=no\nTRACE_DUMP_STAT=die\nSERVER_STATE_TYPE=string\nAny.Property=1",
+  expect("/dev/fd/3 -- true",
+         "JOURNAL=no\nTRACE_DUMP_STAT=die\nSERVER_STATE_TYPE=string\nAny.Property=1",
          {0, "", at + "2: TRACE_DUMP_STAT: not a key of the simulator's; it changes nothing\n"});
   expect("/dev/fd/3 -- true",
          "not a line\nBUS=maybe\nTIMESTAMP=a/b\nTIMESTAMP_TYPE=text\nHELPER_ANSWER=slow:-1",
@@ -61,11 +61,10 @@ TEST(Simulator, GivesTheStatusOfItsCommandOrRefusesWhatItCannotRead) {
           at + "4: TIMESTAMP_TYPE: \"text\" is not string, integer, boolean, other, "
           "missing or no-dictionary\n" +
           at + "3: TIMESTAMP: \"a/b\" is not a part of a file name\n" +
-          at + "5: HELPER_ANSWER: \"slow:-1\" is not made of answer, no-dictionary, wrong-signature, "
-          "silent, die, restart, status:NUMBER and slow:MILLISECONDS\n"});
+          at + "5: HELPER_ANSWER: \"slow:-1\" is not made of answer, no-dictionary, "
+          "wrong-signature, silent, die, restart, status:NUMBER and slow:MILLISECONDS\n"});
+  // clang-format on
 }
-
-// clang-format on
 
 TEST(Simulator, CleansUpHoweverItEnds) {
   for (const int signalNumber : {0, SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {

@@ -23,7 +23,7 @@ const ProcessResult kStarted = {0, rootHelp("velltool"), ""};
 
 }  // namespace
 
-TEST(StartUp, NeedsARadioAndADaemon) {
+TEST(StartUp, RefusesWithoutRadioOrDaemon) {
   const std::pair<const char*, ProcessResult> cases[] = {
       {"", kNoRadio},
       {"RADIO_TYPE=0\nPRODUCT_CODE=58", kNoRadio},
@@ -58,7 +58,7 @@ TEST(StartUp, TakesItsNameFromTheCommandLine) {
             greeting + greeting + greeting);
 }
 
-TEST(StartUp, ReadsCommandsFromAPipeOrATerminal) {
+TEST(StartUp, ReadsCommandsFromPipeOrTerminal) {
   const SimulatedDevice device("RADIO_TYPE=1\nTIMESTAMP=T");
   EXPECT_EQ(device.runTool("<<< quit"), (ProcessResult{0, kPrompt, ""}));
   EXPECT_EQ(device.runTool("< <(printf 'cd logdump\\nback\\nhelp')"),
@@ -77,7 +77,7 @@ TEST(StartUp, ReadsCommandsFromAPipeOrATerminal) {
   EXPECT_EQ(onTerminal.finish().status, 1);
 }
 
-TEST(StartUp, ReportsWhatIsWrongWithTheProfileAndGoesOn) {
+TEST(StartUp, ReportsProfileFaultsAndGoesOn) {
   const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
   SystemLogSocket log(device.root());
   const std::string profile = device.root() / "etc/vell/device.conf";
@@ -93,7 +93,7 @@ TEST(StartUp, ReportsWhatIsWrongWithTheProfileAndGoesOn) {
   EXPECT_EQ(log.messages(), std::vector{profile + ": not a file"});
 }
 
-TEST(StartUp, SaysWhyTheShellThreadCannotBeStarted) {
+TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
 #ifdef VELL_SANITIZED
   GTEST_SKIP() << "A sanitizer needs an address space without limits.";
 #endif
