@@ -65,8 +65,8 @@ TEST(StartUp, ReadsCommandsFromPipeOrTerminal) {
             (ProcessResult{
                 1, kPrompt + "(/velltool/logdump)>> " + kPrompt + kStarted.output + kPrompt, ""}));
 
-  auto onTerminal =
-      device.start({"TERM=dumb", "script", "-qec", "'" VELLTOOL_PATH "'", "/dev/null"});
+  auto onTerminal = device.start(
+      {"TERM=dumb", "script", "-qec", std::string("'") + VELLTOOL_PATH + "'", "/dev/null"});
   // The prompt is there before anything is typed; the terminal shows what is typed.
   EXPECT_EQ(onTerminal.readUntil(">> "), kPrompt);
   onTerminal.write("logdump tel\n");
