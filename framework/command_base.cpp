@@ -1,5 +1,6 @@
 #include "framework/command_base.h"
 
+#include <algorithm>
 #include <utility>
 
 CommandBase::CommandBase(std::string nodeName, std::weak_ptr<CommandBase> parentNode)
@@ -63,12 +64,9 @@ bool CommandBase::isValidCommand(std::string word) const {
 
 std::set<std::string> CommandBase::getWords() const {
   std::set<std::string> words;
-  for (const auto& [word, handler] : handlers) {
-    words.insert(word);
-  }
-  for (const auto& [word, child] : subCommands) {
-    words.insert(word);
-  }
+  const auto add = [&](const auto& entry) { words.insert(entry.first); };
+  std::for_each(handlers.begin(), handlers.end(), add);
+  std::for_each(subCommands.begin(), subCommands.end(), add);
   return words;
 }
 

@@ -13,7 +13,8 @@ std::set<std::string> wordsAt(const CommandBase& node, Next next) {
   std::set<std::string> words = node.getWords();
   std::erase_if(words, [&](const std::string& word) {
     return word == "--" || splitAtWhiteSpace(word) != std::list<std::string>{word} ||
-           (next == Next::path && (!node.isValidSubCommand(word) || word.find('/') != word.npos));
+           (next == Next::path &&
+            (!node.isValidSubCommand(word) || word.find('/') != std::string::npos));
   });
   if (next != Next::path) {
     words.insert({"cd", "help"});
@@ -50,7 +51,8 @@ Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const s
       next = Next::laterWord;
     }
   }
-  if (const auto slash = typed.rfind('/'); node && next == Next::path && slash != typed.npos) {
+  if (const auto slash = typed.rfind('/');
+      node && next == Next::path && slash != std::string::npos) {
     node = followPath(node, typed.substr(0, slash)) ? node : nullptr;
     typed.erase(0, slash + 1);
   }

@@ -50,8 +50,9 @@ std::optional<std::wstring> toCharacters(const std::string& text) {
   if (std::mbstowcs(decoded.data(), text.c_str(), text.size()) > text.size()) {
     return std::nullopt;
   }
+  decoded.resize(std::wcslen(decoded.c_str()));
   std::wstring characters;
-  for (const auto character : std::wstring(decoded.c_str())) {
+  for (const auto character : decoded) {
     const auto joined = joinMark(characters.empty() ? L'\0' : characters.back(), character);
     if (joined == 0 || std::iswprint(static_cast<std::wint_t>(character)) == 0) {
       return std::nullopt;

@@ -16,6 +16,7 @@
 #include <cstdlib>
 #include <cwchar>
 #include <iostream>
+#include <iterator>
 #include <string_view>
 #include <utility>
 
@@ -146,9 +147,7 @@ unsigned char completeWord(EditLine* editor, int /*key*/) {
     return CC_ERROR;
   }
   std::cout << "\x1b[J\n";
-  for (const auto& word : words) {
-    std::cout << word << ' ';
-  }
+  std::copy(words.begin(), words.end(), std::ostream_iterator<std::string>(std::cout, " "));
   std::cout << '\n';
   el_wset(editor, EL_REFRESH);
   return CC_NORM;
@@ -157,12 +156,11 @@ unsigned char completeWord(EditLine* editor, int /*key*/) {
 /// Makes the editor, which lives as long as the process; null where lines are not to be edited.
 EditLine* makeEditor() {
   const char* const terminal = std::getenv("TERM");
-  auto* const utf8 = newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
   if (terminal == nullptr || *terminal == '\0' || terminal == std::string_view("dumb") ||
-      isatty(STDOUT_FILENO) == 0 || utf8 == nullptr || !watchTerminal()) {
+      isatty(STDOUT_FILENO) == 0 || !watchTerminal()) {
     return nullptr;
   }
-  uselocale(utf8);  // Of this thread alone.
+  uselocale(newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr));  // Of this thread alone.
   auto* const screen = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
   auto* const editor = el_init_fd("", stdin, screen, fopencookie(nullptr, "w", {}), STDIN_FILENO,
                                   STDOUT_FILENO, STDERR_FILENO);

@@ -109,17 +109,17 @@ TEST(LineEditing, LeavesTheTerminalAsItWas) {
   const auto shell = std::to_string(std::stoi(screen.command("display-message -p '#{pane_pid}'")));
   const struct {
     std::string keys;
-    int signal;
     std::string shown;
+    int signal;
     int status;
-  } cases[] = {{"C-u C-d", 0, "", 1},
-               {"t Enter", 0, "quit\n", 0},
-               {"C-c", 0, "qui\n", 130},
-               {"", SIGTERM, "quiTerminated\n", 143},
-               {"", SIGHUP, "quiHangup\n", 129},
-               {"", SIGABRT, "quiAborted\n", 134},
-               {"C-z", 0, "qui\n[1]+  Stopped                 velltool\n", 148}};
-  for (const auto& [keys, signal, shown, status] : cases) {
+  } cases[] = {{"C-u C-d", "", 0, 1},
+               {"t Enter", "quit\n", 0, 0},
+               {"C-c", "qui\n", 0, 130},
+               {"", "quiTerminated\n", SIGTERM, 143},
+               {"", "quiHangup\n", SIGHUP, 129},
+               {"", "quiAborted\n", SIGABRT, 134},
+               {"C-z", "qui\n[1]+  Stopped                 velltool\n", 0, 148}};
+  for (const auto& [keys, shown, signal, status] : cases) {
     SCOPED_TRACE(keys + std::to_string(signal));
     screen.startTool();
     screen.type("qui");
