@@ -24,7 +24,7 @@ namespace {
 
 // What libedit's calls back need, on the thread that reads.
 HistoryW* lineHistory = nullptr;
-std::wstring prompt;
+std::wstring shownPrompt;
 const Completer* completer = nullptr;
 std::size_t columns = 0;              ///< Of the screen, when it was last looked at.
 std::optional<std::wstring> lastTab;  ///< The line up to the cursor when Tab last added nothing.
@@ -53,7 +53,7 @@ bool hasNewWidth() {
 /// Rows of the screen above the one in which the prompt and `line` end.
 std::size_t rowsAbove(const std::wstring& line) {
   std::size_t cells = 0;
-  for (const auto character : prompt + line) {
+  for (const auto character : shownPrompt + line) {
     const auto width = static_cast<std::size_t>(wcwidth(character) < 0 ? 2 : wcwidth(character));
     const auto left = columns - cells % columns;
     cells += width > left ? left + width : width;
@@ -169,7 +169,7 @@ EditLine* makeEditor() {
   history_w(lineHistory, &event, H_SETSIZE, 1000);
   el_wset(editor, EL_HIST, history_w, lineHistory);
   el_wset(
-      editor, EL_PROMPT, +[](EditLine*) { return prompt.data(); });
+      editor, EL_PROMPT, +[](EditLine*) { return shownPrompt.data(); });
   el_wset(editor, EL_GETCFN, readCharacter);
   el_set(editor, EL_EDITOR, "emacs");
   el_set(editor, EL_ADDFN, "complete", "", completeWord);
@@ -188,7 +188,7 @@ std::optional<std::string> readLine(const std::string& promptText, const Complet
     restoreTerminal();
     return readPlainLine(promptText);
   }
-  prompt = *characters;
+  shownPrompt = *characters;
   completer = &complete;
   lastTab.reset();
   hasNewWidth();
