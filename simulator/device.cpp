@@ -53,9 +53,22 @@ bool awaitLine(int file) {
   return false;
 }
 
-std::vector<pid_t> children() {
-  std::ifstream list("/proc/thread-self/children");
+/// The children of a process with one thread.
+std::vector<pid_t> childrenOf(pid_t process) {
+  const auto id = std::to_string(process);
+  std::ifstream list("/proc/" + id + "/task/" + id + "/children");
   return {std::istream_iterator<pid_t>(list), {}};
+}
+
+/// Sends a signal to `process` and all that descend from it, as the terminal does for its keys. A
+/// shell that waits for a program leaves SIGINT to that.
+void signalFamily(pid_t process, int signalNumber) {
+  // Found first: a child whose parent ends is no descendant any more.
+  const auto children = childrenOf(process);
+  kill(process, signalNumber);
+  for (const pid_t child : children) {
+    signalFamily(child, signalNumber);
+  }
 }
 
 }  // namespace
@@ -146,7 +159,7 @@ int Device::run(const std::vector<std::string>& command) {
     const bool fromTerminal =
         (received == SIGINT || received == SIGQUIT) && info.si_code == SI_KERNEL;
     if (received > 0 && received != SIGCHLD && !fromTerminal) {
-      kill(process, received);
+      signalFamily(process, received);
       ending = true;
     }
   }
@@ -154,7 +167,7 @@ int Device::run(const std::vector<std::string>& command) {
 }
 
 bool Device::endOneOther() {
-  for (const pid_t child : children()) {
+  for (const pid_t child : childrenOf(getpid())) {
     if (!services.contains(child)) {
       kill(child, SIGKILL);
       awaitChild(child);

@@ -31,8 +31,9 @@ class Device {
   bool start(const DeviceModel& model);
 
   /// Runs `command` in the device and returns its exit status, 128 and the signal when one ended
-  /// it. A signal to end that this process gets meanwhile goes to the command, which is killed when
-  /// it does not obey soon. Services that ask for it are started again meanwhile.
+  /// it. A signal to end that this process gets meanwhile goes to the command and all that descends
+  /// from it; a command that does not obey soon is killed. Services that ask for it are started
+  /// again meanwhile.
   int run(const std::vector<std::string>& command);
 
  private:

@@ -70,8 +70,9 @@ TEST(Simulator, CleansUpHoweverItEnds) {
   for (const int signalNumber : {0, SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     const auto number = std::to_string(signalNumber);
     // What it leaves running would hold its output open.
-    const auto line =
-        "setsid sleep 100 & kill -" + number + " $PPID; test " + number + " = 0 || wait";
+    // A shell that waits for a program, here a second shell, leaves SIGINT to that.
+    const auto line = "sh -c \"setsid sleep 100 & kill -" + number + " $PPID; test " + number +
+                      " = 0 || wait\"; :";
     auto simulator =
         startSimulator("/dev/fd/3 -- sh -c 'echo \"$VELL_SYSROOT\"; " + line + "'", "JOURNAL=yes");
     const auto root = simulator.readLine();
