@@ -8,11 +8,10 @@
 
 namespace simulator {
 
-/// Sends `signalNumber` to a child when this process ends, and leaves it out of signals that the
-/// terminal sends when it is a service.
+/// How a child goes with this process.
 struct ChildManners {
-  int signalAtParentsDeath = SIGKILL;
-  bool isService = true;
+  int signalAtParentsDeath = SIGKILL;  ///< Sent to the child when this process ends.
+  bool isService = true;               ///< The child gets no signals from the terminal.
 };
 
 /// Starts `words` (at least one, looked up along PATH) as a child of this process, with all signals

@@ -71,5 +71,9 @@ LogReader::~LogReader() = default;
 void LogReader::setFlags(unsigned flags) { logDevice.flags = flags; }
 void LogReader::setFilter(LogFilter filter) { logDevice.filter = filter; }
 void LogReader::setEntryHandler(EntryHandler handler) { logDevice.entryHandler = handler; }
-void LogReader::setInvalidationHandler(InvalidationHandler handler) { logDevice.endHandler = handler; }
+void LogReader::setInvalidationHandler(InvalidationHandler handler) {
+  logDevice.endHandler = handler;
+}
 void LogReader::invalidate() { logDevice.invalidated = true; }
+
+// clang-format on

@@ -12,7 +12,7 @@ class ShellWithoutTree : public CommandShell {
   std::shared_ptr<CommandBase> createRootCommand() override { return nullptr; }
 };
 
-/// A shell over a tree of two levels; what is called "locked" is not allowed.
+/// A shell over a tree of two levels; "locked" is not allowed, and "odd" has built-in words.
 class TestShell : public CommandShell {
   std::shared_ptr<CommandBase> createRootCommand() override {
     return PlainNode::create("t", {}, [](PlainNode& root) {
@@ -20,6 +20,7 @@ class TestShell : public CommandShell {
       for (const auto* name : {"deep", "locked", "no"}) {
         root.addChild(name, [](PlainNode& node) { node.addHandlers({"ok", "no", "locked"}); });
       }
+      root.addChild("odd", [](PlainNode& node) { node.addHandlers({"cd", "help", "back"}); });
     });
   }
 };
@@ -31,7 +32,8 @@ std::string helpOf(const std::string& name) {
                                     : both +
                                           "\t            deep  -  [locked|no|ok]\n\n"
                                           "\t          locked  -  [locked|no|ok]\n\n"
-                                          "\t              no  -  [locked|no|ok]\n\n");
+                                          "\t              no  -  [locked|no|ok]\n\n"
+                                          "\t             odd  -  [back|cd|help]\n\n");
 }
 
 std::string invalid(const std::string& word, const std::string& node) {
@@ -50,13 +52,13 @@ void expectRun(std::list<std::string> words, const std::string& input, const std
 
 }  // namespace
 
-// clang-format off
-
 TEST(CommandShell, RunsTheWordsOfACommandLine) {
+  // clang-format off
   expectRun({"--"}, "", "", true);
   expectRun({"no"}, "", "no\n", false);
   expectRun({"deep", "ok", "a", "", "cd", "help"}, "", "ok,a,,cd,help\n", true);
-  expectRun({"--", "ok", "1", "--", "--", "deep", "no", "---", "--", "ok"}, "", "ok,1\nno,---\n", false);
+  expectRun({"--", "ok", "1", "--", "--", "deep", "no", "---", "--", "ok"}, "",
+            "ok,1\nno,---\n", false);
   expectRun({"help", "--", "ok", "--"}, "", helpOf("t") + "ok\n", true);
   expectRun({"deep", "help"}, "", helpOf("deep"), true);
   expectRun({"help", "deep"}, "", invalid("help", "t"), false);
@@ -77,9 +79,14 @@ TEST(CommandShell, RunsTheWordsOfACommandLine) {
   expectRun({"cd", "deep/nosuch"}, "", helpOf("deep"), false);
   expectRun({"cd", "//deep//../locked/.././.."}, "", helpOf("t"), false);
   expectRun({"cd", "..//deep/../../locked/", "--", "cd", "///", "--", "ok"}, "", "ok\n", true);
+  // A handler wins over the built-in word, but for "cd".
+  expectRun({"odd", "help", "--", "odd", "back"}, "", "help\nback\n", true);
+  expectRun({"odd", "cd", "..", "--", "ok"}, "", "ok\n", true);
+  // clang-format on
 }
 
 TEST(CommandShell, ReadsLinesUntilTheUserLeaves) {
+  // clang-format off
   const std::string p = "(/t)>> ";
   expectRun({}, "", p, false);
   expectRun({}, "quit\nok\n", p, true);
@@ -87,14 +94,16 @@ TEST(CommandShell, ReadsLinesUntilTheUserLeaves) {
   expectRun({}, "  ok\ta  \"b c\\ d\"\r\nok last line",
             p + "ok,a,\"b,c\\,d\"\n" + p + "ok,last,line\n" + p, false);
   expectRun({}, "no -- ok\nok 1 -- quit -- ok\n", p + "no\n" + p + "ok,1\n", true);
-  expectRun({}, "cd deep\nok\nback\nback\nquit\n", p + "(/t/deep)>> ok\n(/t/deep)>> " + p + p, true);
+  expectRun({}, "cd deep\nok\nback\nback\nquit\n",
+            p + "(/t/deep)>> ok\n(/t/deep)>> " + p + p, true);
   expectRun({}, "cd deep/nosuch\nquit\n", p + helpOf("deep") + p, true);
-  expectRun({}, "cd locked\ncd ../deep -- ok x -- cd ..\nquit\n", p + "(/t/locked)>> ok,x\n" + p, true);
-  expectRun({}, "deep\ndeep back\nquit\n", p + helpOf("deep") + p + invalid("back", "deep") + p, true);
+  expectRun({}, "cd locked\ncd ../deep -- ok x -- cd ..\nquit\n",
+            p + "(/t/locked)>> ok,x\n" + p, true);
+  expectRun({}, "deep\ndeep back\nquit\n",
+            p + helpOf("deep") + p + invalid("back", "deep") + p, true);
   expectRun({}, std::string("ok a\0b\n", 7), p + std::string("ok,a\0b\n", 7) + p, false);
+  // clang-format on
 }
-
-// clang-format on
 
 TEST(CommandShell, ReadsLinesForAnEmptyArgumentListButNoneWithoutATree) {
   const Console console("quit\n");

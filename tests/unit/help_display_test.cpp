@@ -4,7 +4,7 @@
 
 #include <gtest/gtest.h>
 
-TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltInsSortedByBytes) {
+TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltIns) {
   const auto fill = [](PlainNode& node) {
     node.addHandlers({"telx", "tel", "abc", "Zed", "a_word_of_16_chr", "\xC3\xA4"}, "[text] <|");
     node.addHandlers({"tel"});
@@ -12,7 +12,10 @@ TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltInsSortedByBytes) {
     node.addHandlers({"stat"});
     node.addChild("route", [](PlainNode& route) {
       route.addHandlers({"del", "add"}, "not shown");
-      route.addChild("cache", [](PlainNode& cache) { cache.addHandlers({"flush"}); });
+      route.addChild("cache", [](PlainNode& cache) {
+        cache.addHandlers({"flush"});
+        cache.addChild("page", [](PlainNode& page) { page.addHandlers({"drop"}); });
+      });
     });
     // A node without handlers is passed over, but not what is below.
     node.addChild("top", [](PlainNode& top) {
@@ -33,7 +36,8 @@ TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltInsSortedByBytes) {
       "\t              \xC3\xA4  -  [text] <|\n\n"
       "\ta_name_of_more_than_16  -  [x|]]\n\n"
       "\t           route  -  [add|del]\n"
-      "\t                     <cache>  -  [flush]\n\n"
+      "\t                     <cache>  -  [flush]\n"
+      "\t                                     <page>  -  [drop]\n\n"
       "\t                     <leaf>  -  [go]\n\n";
   EXPECT_EQ(console.output(), helpText("n", entries) + helpText("empty", ""));
 }

@@ -53,8 +53,8 @@ TEST(OsLogHandler, SortsItsWordsIntoTheSelection) {
 TEST(OsLogHandler, ReadsTheHistoryAsFarAsItIsANumber) {
   // clang-format off
   const std::pair<const char*, int> cases[] = {
-      {"60", 60}, {" \t+12abc", 12}, {"abc", 0}, {"", 0}, {"0x10", 0}, {"-60", -60}, {"3600.9", 3600},
-      {"99999999999", 2147483647}, {"-99999999999", -2147483648}};
+      {"60", 60}, {" \t+12abc", 12}, {"abc", 0}, {"", 0}, {"0x10", 0}, {"-60", -60},
+      {"3600.9", 3600}, {"99999999999", 2147483647}, {"-99999999999", -2147483648}};
   // clang-format on
   for (const auto& [word, seconds] : cases) {
     SCOPED_TRACE(word);

@@ -33,8 +33,9 @@ bool exportAll() {
 
 /// An entry of the message "one" with everything in it, logged at 13:07:21 GMT.
 LogEntry fullEntry() {
-  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kWest, 0x1a2b,
-          0, 42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link", "calls", "one"};
+  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kWest,
+          0x1a2b, 0, 42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link",
+          "calls", "one"};
 }
 
 TEST(OsLogStream, SetsUpTheReaderAndWritesOneLineForEachMessage) {
@@ -42,7 +43,8 @@ TEST(OsLogStream, SetsUpTheReaderAndWritesOneLineForEachMessage) {
       {[](LogEntry&) {}, kLine},
       {[](LogEntry& e) { e.time = LogTime(std::chrono::microseconds(-1)); },
        "1969-12-31 09:59:59" + kLine.substr(19)},
-      {[](LogEntry& e) { e.processIdentifier = -7, e.threadIdentifier = e.activityIdentifier = ~0UL; },
+      {[](LogEntry& e) { e.processIdentifier = -7,
+                         e.threadIdentifier = e.activityIdentifier = ~0UL; },
        "2021-05-03 23:07:21 +0000 0xffffffffffffffff 0xffffffffffffffff -7 " + kLine.substr(41)},
       {[](LogEntry& e) { e.type = 0; }, ""},
   };
@@ -77,7 +79,8 @@ TEST(OsLogStream, TellsTheSystemLogWhatFailed) {
       {[](LogDevice& d) { d.endReason.reset(); }, false,
        {kStarted, "Timeout on getting oslog stream"}, kLine + kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 1; }, false, {kStarted, full}, kLine},
-      {[](LogDevice& d) { d.appendsUntilFull = 0, d.endReason.reset(); }, false, {kStarted, full}, ""},
+      {[](LogDevice& d) { d.appendsUntilFull = 0, d.endReason.reset(); },
+       false, {kStarted, full}, ""},
   };
   for (const auto& [prepare, result, messages, content] : cases) {
     SCOPED_TRACE(testing::PrintToString(messages));
