@@ -33,8 +33,16 @@ std::optional<std::wstring> lastTab;  ///< The line up to the cursor when Tab la
 ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   static std::mbstate_t state;
   std::wstring characters(count, L'\0');
-  characters.resize(mbsnrtowcs(characters.data(), &bytes, count, count, &state));
-  std::cout << toText(characters);
+  const auto* rest = bytes;
+  const auto length = mbsnrtowcs(characters.data(), &rest, count, count, &state);
+  if (length == static_cast<std::size_t>(-1)) {
+    // A sequence of the terminal may hold bytes that are no UTF-8, see terminfo(5).
+    state = {};
+    std::cout.write(bytes, static_cast<std::streamsize>(count));
+  } else {
+    characters.resize(length);
+    std::cout << toText(characters);
+  }
   return static_cast<ssize_t>(count);
 }
 
