@@ -29,8 +29,10 @@ void handleSignal(int number) {
       std::signal(number, SIG_DFL);
       raise(number);  // It comes when this returns.
     }
-    pending = number == SIGWINCH && pending != 0 ? pending.load() : number;
-    wakeUp->signal();
+    if (number != SIGABRT) {
+      pending = number == SIGWINCH && pending != 0 ? pending.load() : number;
+      wakeUp->signal();
+    }  // Else the reader, awake before the end comes, would set the terminal for editing.
   }
 }
 
