@@ -2,6 +2,7 @@
 
 #include "tests/end_to_end/test_process.h"
 
+#include <array>
 #include <atomic>
 #include <cstddef>
 #include <filesystem>
@@ -76,9 +77,9 @@ void forEachAtOnce(const Rows& rows, const Check& check) {
       check(rows[row]);
     }
   };
-  std::vector<std::future<void>> threads;
-  for (int thread = 0; thread < 4; ++thread) {
-    threads.push_back(std::async(std::launch::async, checkRows));
+  std::array<std::future<void>, 4> threads;
+  for (auto& thread : threads) {
+    thread = std::async(std::launch::async, checkRows);
   }
   for (auto& thread : threads) {
     thread.get();
