@@ -42,3 +42,32 @@ TEST(SystemLog, TakesLongMessagesWholeAndHoldsTheToolUpForASecondInAll) {
     EXPECT_EQ(log.messages().at(1), path + ":4: not a KEY=value line");
   }
 }
+
+TEST(SystemLog, TakesTheFaultsOfSettingsOnce) {
+  const SimulatedDevice device("MANAGER=absent");
+  SystemLogSocket log(device.root());
+  const auto profile = (device.root() / "etc/vell/device.conf").string();
+  const auto traces = (device.root() / "var/lib/vell/traces.conf").string();
+  const std::string failure = "Baseband log collection: Failed\n";
+  // What the shell does to the settings, in turn; what the tool prints then, and logs.
+  const std::tuple<std::string, std::string, std::vector<std::string>> cases[] = {
+      {R"(rm "$1" && mkfifo "$1")",
+       "'velltool' is not supported on this product.\n",
+       {profile + ": not a file"}},
+      {R"(rm "$1" && printf 'RADIO_TYPE=1\nPRODUCT_CODE=many\n\nnonsense\nCARRIER_BUILD="' >"$1")",
+       kPrompt + failure + kPrompt + failure + kPrompt,
+       {profile + ":4: not a KEY=value line",
+        profile + ":5: CARRIER_BUILD: value is not quoted as it must be",
+        profile + ":2: PRODUCT_CODE: 'many' is not an integer"}},
+      {R"(echo RADIO_TYPE=1 >"$1" && printf "Baseband.TraceEnabled 'yes'\nnonsense" >"$2")",
+       kPrompt + failure + kPrompt + failure + kPrompt,
+       {traces + ":1: not a KEY=value line", traces + ":2: not a KEY=value line"}},
+      {R"(rm "$2" && mkdir "$2")",
+       kPrompt + failure + kPrompt + failure + kPrompt,
+       {traces + ": not a file"}}};
+  for (const auto& [change, output, messages] : cases) {
+    const auto line = change + R"( && printf 'logdump bb\nlogdump bb\n' | "$0")";
+    EXPECT_EQ(device.runLine(line, {profile, traces}).output, output);
+    EXPECT_EQ(log.messages(), messages);
+  }
+}
