@@ -1,6 +1,6 @@
 // The words of the commands and the manager's answers, read by the tool and by a model.
 //
-// An input is words, one a line; the first is also the value of a trace property.
+// An input is words, one a line; each is also taken for the value of a trace property.
 
 #include "logdump/logdump_args.h"
 #include "logdump/logdump_command.h"
@@ -10,12 +10,12 @@
 #include "tests/fuzz/fuzz_target.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"
+#include "tests/unit/console.h"
 
 #include <algorithm>
 #include <cctype>
 #include <climits>
 #include <map>
-#include <optional>
 #include <sstream>
 
 namespace {
@@ -23,72 +23,70 @@ namespace {
 using Words = std::vector<std::string>;
 
 std::string lowered(std::string word) {
-  for (auto& character : word) {
-    character = static_cast<char>(std::tolower(static_cast<unsigned char>(character)));
-  }
+  std::transform(word.begin(), word.end(), word.begin(),
+                 [](unsigned char c) { return std::tolower(c); });
   return word;
-}
-
-/// What a trace property says as a mode.
-std::optional<long> modeOf(const std::string& text) {
-  static const std::map<std::string, long> words = {{"false", 0}, {"off", 0}, {"no", 0},
-                                                    {"true", 1},  {"on", 1},  {"yes", 1},
-                                                    {"full", 1},  {"lite", 2}};
-  char* end = nullptr;
-  const long number = std::strtol(text.c_str(), &end, 0);
-  if (const auto word = words.find(lowered(text)); word != words.end()) {
-    return word->second;
-  }
-  const bool whole = end != text.c_str() && end == text.c_str() + text.size();
-  return whole && number == static_cast<int>(number) ? std::optional(number) : std::nullopt;
 }
 
 void checkTraceValue(const std::string& text) {
   static const auto node = LogdumpCommand::create("logdump", {}, nullptr, {});
-  const auto mode = modeOf(text);
+  static const std::map<std::string, std::string> words = {
+      {"false", "0"}, {"off", "0"}, {"no", "0"},   {"true", "1"},
+      {"on", "1"},    {"yes", "1"}, {"full", "1"}, {"lite", "2"}};
+  const auto word = words.find(lowered(text));
+  const auto number = word != words.end() ? word->second : text;
+  char* end = nullptr;
+  const long mode = std::strtol(number.c_str(), &end, 0);
+  const bool known =
+      !number.empty() && end == number.c_str() + number.size() && mode == static_cast<int>(mode);
   for (const bool before : {false, true}) {
     bool flag = before;
     parseTraceFlag(text, flag);
-    require(flag == (mode ? *mode != 0 : before), "another flag");
+    require(flag == (known ? mode != 0 : before), "another flag");
   }
   in_process::device.traceProperty = text;
-  require(isSystemLogsTraceModeThree(dynamic_cast<LogdumpCommand&>(*node)) == (mode == 3),
+  require(isSystemLogsTraceModeThree(dynamic_cast<LogdumpCommand&>(*node)) == (known && mode == 3),
           "another mode");
 }
 
 void checkCollection(const Words& words) {
   static const std::map<std::string, CompressionMode> modes = {
       {"nocompress", 0}, {"tar.gz", 1}, {"tar", 2}, {"nonui", 3}};
-  CompressionMode counted[] = {7, 7};
+  CompressionMode counted[] = {0, 0};
   auto at = words.begin();
   for (; at != words.end() && modes.contains(lowered(*at)); ++at) {
     const auto value = modes.at(lowered(*at));
     counted[value / 3] = value;
   }
-  CompressionMode mode = 7;
-  bool nonui = false;
-  std::string reason;
-  std::list<std::string> args(words.begin(), words.end());
-  parseLogdumpArgs(args, mode, reason, nonui);
-  requireEqual(reason, "[velltool] " + (at == words.end() ? "User triggered" : *at));
-  require(mode == counted[0] && nonui == (counted[1] == 3), "another mode or flag");
+  const auto options = readLogdumpOptions({words.begin(), words.end()});
+  requireEqual(options.reason, "[velltool] " + (at == words.end() ? "User triggered" : *at));
+  require(options.mode == counted[0] && options.nonui == (counted[1] == 3), "another mode or flag");
 }
 
 void checkExport(const Words& words) {
-  std::string lists[3];  // Of processes, of image paths, and of what is dropped.
-  int list = 2;
-  for (std::size_t at = 2; at < words.size(); ++at) {
-    const bool option = words[at].starts_with('-');
-    list = !option ? list : words[at] == "-p" ? 0 : words[at] == "-i" ? 1 : 2;
-    lists[list] += option ? "" : words[at] + "\n";
-  }
   auto& device = in_process::logDevice = {};
-  require(makeOsLogHandler()(WorkGroup::create(), {words.begin(), words.end()}), "no export");
-  std::string selected[2];
-  for (const auto& [kind, text] : device.filter.value_or(LogFilter())) {
-    selected[kind == LogComparison::Kind::ProcessEquals ? 0 : 1] += text + "\n";
+  const Console console;
+  const bool exported = makeOsLogHandler()({}, {words.begin(), words.end()});
+  require(exported == (words.size() > 1) && exported == device.from.has_value(), "another result");
+  requireEqual(console.output(), exported ? "" : "os log collection: Failed\n");
+  if (!exported) {
+    return;
   }
-  requireEqual(selected[0] + "--" + selected[1], lists[0] + "--" + lists[1]);
+  static const auto defaults = split(
+      "60 out -p Linkward LinkwardMobileHelper LinkwardRootHelper vell-helper Airgroved Tessfield "
+      "voltkeeperd -i HaldenBaseband",
+      " ");
+  const auto& selection = words.size() == 2 ? defaults : words;
+  std::map<std::string, std::string> expected, selected;  // By the option that stands before them.
+  std::string option;
+  for (auto word = selection.begin() + 2; word != selection.end(); ++word) {
+    option = word->starts_with('-') ? *word : option;
+    expected[option] += word->starts_with('-') ? "" : *word + "\n";
+  }
+  for (const auto& [kind, text] : device.filter.value_or(LogFilter())) {
+    selected[kind == LogComparison::Kind::ProcessEquals ? "-p" : "-i"] += text + "\n";
+  }
+  requireEqual(selected["-p"] + "--" + selected["-i"], expected["-p"] + "--" + expected["-i"]);
   long long history = 0;
   std::istringstream(words[0]) >> history;
   history = std::clamp<long long>(history, INT_MIN, INT_MAX);
@@ -100,10 +98,8 @@ void checkExport(const Words& words) {
 
 int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   const auto words = split({reinterpret_cast<const char*>(data), size}, "\n");
-  checkTraceValue(words.front());
+  std::for_each(words.begin(), words.end(), checkTraceValue);
   checkCollection(words);
-  if (words.size() > 2) {
-    checkExport(words);
-  }
+  checkExport(words);
   return 0;
 }

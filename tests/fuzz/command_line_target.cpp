@@ -1,8 +1,8 @@
 // The shell on a tree of any shape, beside a model of its rules.
 //
-// The first line of an input is the tree: "ok" is a handler, and "a( ok )" a node that has one.
-// With a "!" before it, each further line is a word of a command line; else it is typed at the
-// prompt.
+// The first line of an input is the tree: "ok" is a handler, and "a( ok )" a node that has one;
+// there is none when it is empty. With a "!" before it, each further line is a word of a command
+// line; else it is typed at the prompt.
 
 #include "framework/command_shell.h"
 #include "tests/fuzz/fuzz_target.h"
@@ -48,10 +48,13 @@ bool fail(const Node& node) {
 
 // The model. What is done goes on from `place`, which it may change.
 
-bool runCd(Node& place, Node node, const Words& operands) {
-  for (const auto& step : split(operands.size() == 1 ? operands[0] : "?/?", "/ \t\n\v\f\r")) {
+bool runCd(Node& place, Node node, const std::list<std::string>& operands) {
+  if (operands.size() != 1) {
+    return fail(node);
+  }
+  for (const auto& step : split(operands.front(), "/ \t\n\v\f\r")) {
     const auto child = node->getSubCommandObj(step);
-    if (operands.size() != 1 || (!child && step != ".." && !step.empty())) {
+    if (!child && step != ".." && !step.empty()) {
       return fail(node);
     }
     node = step.empty() ? node : child ? child : above(node);
@@ -63,31 +66,30 @@ bool runCd(Node& place, Node node, const Words& operands) {
 End runGroup(Node& place, const Words& words) {
   Node node = place;
   for (auto at = words.begin(); at != words.end(); ++at) {
-    const Words rest(at + 1, words.end());
+    const std::list<std::string> rest(at + 1, words.end());
     const auto child = node->getSubCommandObj(*at);
     if (*at == "cd") {
       return runCd(place, node, rest);
     }
-    if (child || node->isValidCommand(*at)) {
-      if (*at == "locked" || node->isValidCommand(*at)) {
-        return *at != "locked" && node->execCommand(*at, {rest.begin(), rest.end()});
-      }
+    if (node->isValidCommand(*at)) {
+      return *at != "locked" && node->execCommand(*at, rest);
+    }
+    if (child && *at != "locked") {
       node = child;
-      if (rest.empty()) {
-        return fail(node);
-      }
+    } else if (child) {
+      return false;
     } else if (*at == "help" && rest.empty()) {
       return !fail(node);
-    } else if (words.size() == 1 && *at == "back") {
-      place = above(place);
-    } else if (words.size() == 1 && (*at == "quit" || *at == "exit")) {
+    } else if (*at == "back" && words.size() == 1) {
+      node = place = above(place);
+    } else if ((*at == "quit" || *at == "exit") && words.size() == 1) {
       return std::nullopt;
     } else {
       std::cout << std::endl << "Invalid command option '\x1b[31m" << *at << "\x1b[39m'";
       return fail(node);
     }
   }
-  return true;
+  return node == place || fail(node);
 }
 
 /// Only at a prompt does `place` stay where a group has gone.
@@ -102,11 +104,11 @@ End runGroups(Node& place, const Words& words, bool prompt) {
   return end;
 }
 
-bool runLines(Node place, const Words& lines) {
+bool runLines(Node place) {
   End end = true;
-  for (auto line = lines.begin(); end && line != lines.end(); ++line) {
-    std::cout << "(" << place->getHierarchy() << ")>> ";
-    auto words = split(*line, " \t\v\f\r");
+  const auto prompt = [&] { return "(" + place->getHierarchy() + ")>> "; };
+  for (std::string line; end && std::cout << prompt() && std::getline(std::cin, line);) {
+    auto words = split(line, " \t\v\f\r");
     std::erase(words, "");
     end = runGroups(place, words, true);
   }
@@ -124,20 +126,20 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   Shell shell;
   shell.root = PlainNode::create("t", {}, [&](PlainNode& root) { grow(root, plan); });
   const auto words = split(rest, "\n");
+  auto arguments = CommandShell::convertCmdArgsToList(-1, nullptr);
+  if (!typed) {
+    arguments.assign(words.begin(), words.end());
+    arguments.push_front("t");
+  }
 
   const auto output = [&](auto run) {
     const Console console(rest);
     const bool result = run();
     return console.output() + (result ? "true" : "false");
   };
-  const auto expected = output([&] {
-    Node place = shell.root;
-    return typed ? runLines(place,
-                            split(rest.empty() || rest.ends_with('\n') ? rest : rest + "\n", "\n"))
-                 : runGroups(place, words, false).value_or(true);
-  });
-  std::list<std::string> arguments = {"t"};
-  arguments.insert(arguments.end(), words.begin(), typed ? words.begin() : words.end());
-  requireEqual(output([&] { return shell.run(arguments); }), expected);
+  const auto runModel = [&, place = shell.root]() mutable {
+    return typed ? runLines(place) : runGroups(place, words, false).value_or(true);
+  };
+  requireEqual(output([&] { return shell.run(arguments); }), output(runModel));
   return 0;
 }

@@ -8,25 +8,23 @@
 #include <list>
 #include <memory>
 #include <string>
-#include <utility>
 
-/// A node for trees of the tests' own: `fill` registers what it holds.
+/// A node for trees of the tests' own: `fill` registers what it holds, once it is initialised.
 class PlainNode : public CommandBase {
  public:
   using Fill = std::function<void(PlainNode&)>;
 
-  static std::shared_ptr<PlainNode> create(const std::string& nodeName,
-                                           const std::weak_ptr<CommandBase>& parentNode,
-                                           Fill contents) {
+  static auto create(const std::string& nodeName, const std::weak_ptr<CommandBase>& parentNode,
+                     const Fill& fill) {
     std::shared_ptr<PlainNode> node(new PlainNode(nodeName, parentNode));
-    node->fill = std::move(contents);
     node->init();
+    fill(*node);
     return node;
   }
 
   /// Adds a child of this node, made the way the tool makes its own.
-  void addChild(const std::string& childName, Fill childFill) {
-    addSubCommand(childName, create(childName, weak_from_this(), std::move(childFill)));
+  void addChild(const std::string& childName, const Fill& fill) {
+    addSubCommand(childName, create(childName, weak_from_this(), fill));
   }
 
   /// Adds handlers that write their own word and what they were called with; only "no" fails.
@@ -49,7 +47,5 @@ class PlainNode : public CommandBase {
  private:
   using CommandBase::CommandBase;
 
-  void registerCommands() override { fill(*this); }
-
-  Fill fill;
+  void registerCommands() override {}
 };
