@@ -1,0 +1,39 @@
+#include "tool/vell_shell.h"
+
+#include "logdump/os_log_context.h"
+#include "tests/in_process/device.h"
+#include "tests/in_process/log_device.h"
+#include "tests/unit/console.h"
+
+#include <gtest/gtest.h>
+#include <pthread.h>
+
+TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
+  in_process::device.programName = "mytool";
+  const Console console("cd logdump\nquit\n");
+  EXPECT_TRUE(VellShell().run({"/opt/other"}));
+  EXPECT_EQ(console.output(), "(/mytool)>> (/mytool/logdump)>> ");
+  EXPECT_EQ(in_process::device.clientCalls,
+            (std::vector<std::string>{"CreateManager velltool velltool.queue",
+                                      "RegisterEventHandler ServerStateChange", "EventsOff",
+                                      "EventsOn"}));
+  EXPECT_EQ(in_process::logDevice.longestWait, std::chrono::milliseconds(500));
+}
+
+TEST(VellShell, FailsWhenItsWorkQueueCannotBeStarted) {
+#ifdef VELL_SANITIZED
+  GTEST_SKIP() << "A sanitizer gives threads stacks of its own choice.";
+#endif
+  pthread_attr_t usual{};
+  pthread_getattr_default_np(&usual);
+  pthread_attr_t boundless = usual;
+  ASSERT_EQ(pthread_attr_setstacksize(&boundless, std::size_t{1} << 47U), 0);
+  pthread_setattr_default_np(&boundless);
+  EXPECT_FALSE(VellShell().run({"t", "help"}));
+  pthread_setattr_default_np(&usual);
+}
+
+TEST(OsLogContext, IsTheSameOnEveryCall) {
+  EXPECT_EQ(&GetOsLogContext(), &GetOsLogContext());
+  EXPECT_EQ(GetOsLogContext().subsystem + " " + GetOsLogContext().category, "org.velltool global");
+}
