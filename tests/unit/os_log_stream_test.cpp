@@ -4,102 +4,71 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace {
 
 using in_process::LogDevice;
 using in_process::logDevice;
-using std::chrono::hours;
 
 const std::string kPath = "/exports/out.txt";
 const std::string kStarted = "Getting oslog stream: history = 3600.000000";
 const std::string kLine =
-    "2021-05-03 23:07:21 +0000 0x01a2b 0x0 42 Linkward(libradio.so):org.vell.link [calls] one\n";
+    "1969-12-31 09:59:59 +0000 0xffffffffffffffff 0x2b -7 linkd(r.so):vell [calls] one\n";
 
 const struct : TimeZone {
   [[nodiscard]] std::chrono::seconds offsetAt(std::chrono::sys_seconds) const override {
-    return -hours(14);
+    return std::chrono::hours(-14);
   }
 } kWest;
 
-bool exportAll() {
+/// Exports two messages, and between them an entry that is none, as `prepare` has them come.
+bool exportTwoMessages(void (*prepare)(LogDevice&)) {
+  logDevice = {};
+  logDevice.files[kPath] = "from before";
+  for (const auto type : {kLogEntryMessage, 0U, kLogEntryMessage}) {
+    logDevice.entries.push_back({type, LogTime(std::chrono::microseconds(-1)), &kWest, ~0UL, 0x2b,
+                                 -7, "linkd", "r.so", "/lib/r.so", "vell", "calls", "one"});
+  }
+  prepare(logDevice);
   return OsLogStream::putOsLogStreamToFile(kPath, {}, {}, 3600);
 }
 
-// clang-format off
+}  // namespace
 
-/// An entry of the message "one" with everything in it, logged at 13:07:21 GMT.
-LogEntry fullEntry() {
-  return {kLogEntryMessage, LogTime(std::chrono::microseconds(1'620'133'641'999'999)), &kWest,
-          0x1a2b, 0, 42, "Linkward", "libradio.so", "/usr/lib/libradio.so", "org.vell.link",
-          "calls", "one"};
-}
-
-TEST(OsLogStream, SetsUpTheReaderAndWritesOneLineForEachMessage) {
-  const std::pair<std::function<void(LogEntry&)>, std::string> cases[] = {
-      {[](LogEntry&) {}, kLine},
-      {[](LogEntry& e) { e.time = LogTime(std::chrono::microseconds(-1)); },
-       "1969-12-31 09:59:59" + kLine.substr(19)},
-      {[](LogEntry& e) { e.processIdentifier = -7,
-                         e.threadIdentifier = e.activityIdentifier = ~0UL; },
-       "2021-05-03 23:07:21 +0000 0xffffffffffffffff 0xffffffffffffffff -7 " + kLine.substr(41)},
-      {[](LogEntry& e) { e.type = 0; }, ""},
-  };
-  logDevice = {};
-  logDevice.files[kPath] = "from before";
-  std::string lines;
-  for (const auto& [change, line] : cases) {
-    change(logDevice.entries.emplace_back(fullEntry()));
-    lines += line;
-  }
-  EXPECT_TRUE(exportAll());
-  EXPECT_EQ(logDevice.files[kPath], lines);
-  EXPECT_EQ(logDevice.messages, std::vector{kStarted});
-  EXPECT_EQ(logDevice.flags, 21U);
-  EXPECT_EQ(logDevice.filter, std::nullopt);
-  EXPECT_EQ(logDevice.from, logDevice.now - hours(1));
-  EXPECT_EQ(logDevice.longestWait, std::chrono::seconds(180));
-}
-
-TEST(OsLogStream, TellsTheSystemLogWhatFailed) {
+TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
   const std::string full = "Failed to write file: " + kPath + ": No space left on device";
-  const struct {
-    std::function<void(LogDevice&)> prepare;
-    bool result;
-    std::vector<std::string> messages;
-    std::string content;
-  } cases[] = {
-      {[](LogDevice& d) { d.source = nullptr; }, false, {"Failed to prepare oslog stream"}, ""},
+  // What is amiss, the result, what the system log is told, and what is in the file.
+  const std::tuple<void (*)(LogDevice&), bool, std::vector<std::string>, std::string> cases[] = {
+      // clang-format off
+      {[](LogDevice&) {}, true, {kStarted}, kLine + kLine},
       {[](LogDevice& d) { d.groupsCanBeMade = false; }, false, {"Failed to get group"}, ""},
-      {[](LogDevice& d) { d.endReason = 4'000'000'000; }, true,
-       {kStarted, "Invalid oslog stream: reason = 4000000000"}, kLine + kLine},
-      {[](LogDevice& d) { d.endReason.reset(); }, false,
-       {kStarted, "Timeout on getting oslog stream"}, kLine + kLine},
+      {[](LogDevice& d) { d.endReason = 4'000'000'000; },
+       true, {kStarted, "Invalid oslog stream: reason = 4000000000"}, kLine + kLine},
+      {[](LogDevice& d) { d.endReason.reset(); },
+       false, {kStarted, "Timeout on getting oslog stream"}, kLine + kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 1; }, false, {kStarted, full}, kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 0, d.endReason.reset(); },
        false, {kStarted, full}, ""},
+      // clang-format on
   };
   for (const auto& [prepare, result, messages, content] : cases) {
     SCOPED_TRACE(testing::PrintToString(messages));
-    logDevice = {};
-    logDevice.entries = {fullEntry(), fullEntry()};
-    prepare(logDevice);
-    EXPECT_EQ(exportAll(), result);
+    EXPECT_EQ(exportTwoMessages(prepare), result);
     EXPECT_EQ(logDevice.invalidated, messages.back().starts_with("Timeout"));
     // What comes late finds everything that it needs, and the file closed.
     logDevice.appendsUntilFull = 1;
     if (logDevice.entryHandler) {
-      logDevice.entryHandler(fullEntry());
+      logDevice.entryHandler(logDevice.entries.front());
       logDevice.endHandler(kLogReaderAtEnd, logDevice.now);
     }
     EXPECT_EQ(logDevice.messages, messages);
     EXPECT_EQ(logDevice.files[kPath], content);
   }
+  EXPECT_EQ(logDevice.flags, 21U);
+  EXPECT_EQ(logDevice.filter, std::nullopt);
+  EXPECT_EQ(logDevice.from, logDevice.now - std::chrono::hours(1));
+  EXPECT_EQ(logDevice.longestWait, std::chrono::seconds(180));
 }
-
-// clang-format on
-
-}  // namespace
