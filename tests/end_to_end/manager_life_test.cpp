@@ -62,10 +62,12 @@ TEST(ManagerLife, ToolFollowsTheManagerAndTheBus) {
     expectFailure(tool, manager, manager);
     auto successor = device.serve("manager");
     expectInTime(tool, kCollected);
-    // The bus ends a connection that sends it more than 32 MiB at once.
-    EXPECT_EQ(answerTo(tool, "logdump tel " + std::string(33 << 20, 'x')),
-              "Telephony log collection: Failed\n" + kPrompt);
-    expectInTime(tool, kCollected);
+    if (life == 0) {
+      // The bus ends a connection that sends it more than 32 MiB at once.
+      EXPECT_EQ(answerTo(tool, "logdump tel " + std::string(33 << 20, 'x')),
+                "Telephony log collection: Failed\n" + kPrompt);
+      expectInTime(tool, kCollected);
+    }
     expectFailure(tool, successor, bus);
   }
   tool.write("quit\n");

@@ -4,10 +4,8 @@
 
 SimulatedDevice::SimulatedDevice(const std::string& profile)
     // It tells where the device is, and holds it until the test ends its input.
-    : process({"sh", "-c",
-               R"(exec "$0" /dev/fd/3 -- sh -c '
-                   echo "$VELL_SYSROOT"; echo "$DBUS_SYSTEM_BUS_ADDRESS"; exec cat' 3<<END)"
-               "\nJOURNAL=no\n$1\nEND",
+    : process({"bash", "-c", R"(exec "$0" <(printf 'JOURNAL=no\n%s\n' "$1") -- sh -c '
+                   echo "$VELL_SYSROOT"; echo "$DBUS_SYSTEM_BUS_ADDRESS"; exec cat')",
                VELL_SIMULATOR_PATH, profile}),
       rootPath(process.readLine()),
       address(process.readLine()) {}
