@@ -4,6 +4,8 @@
 
 #include <gtest/gtest.h>
 
+namespace fs = std::filesystem;
+
 simulator::JournalEntry message(long after, const std::string& text, Fields fields) {
   fields.emplace_back("MESSAGE", text);
   return {kTime + std::chrono::microseconds(after), std::move(fields)};
@@ -20,57 +22,62 @@ StoredEntries entries(std::size_t count, const std::string& text, std::size_t af
   return made;
 }
 
-std::string exportFormat(const StoredEntries& entries) {
+std::string lastWords(const std::string& text) {
+  std::string words;
+  for (auto end = text.find('\n'); end != std::string::npos; end = text.find('\n', end + 1)) {
+    const auto start = text.rfind(' ', end) + 1;
+    words += text.substr(start, end - start) + " ";
+  }
+  return words;
+}
+
+std::string DeviceJournal::inRoot(const std::string& line) const {
+  return "cd \"$VELL_SYSROOT\"; J=" + fs::relative(journals(), root()).string() + "; " + line;
+}
+
+fs::path DeviceJournal::journals() const {
+  return (root() / simulator::kJournalFile).parent_path();
+}
+
+void DeviceJournal::store(const std::string& name, const StoredEntries& entries) const {
+  const auto file = journals() / name;
+  fs::create_directories(file.parent_path());
   std::string text;
   for (const auto& entry : entries) {
     text += simulator::toExportFormat(entry);
   }
-  return text;
-}
-
-std::string messagesOf(const std::string& content) {
-  std::string messages;
-  for (auto end = content.find('\n'); end != std::string::npos; end = content.find('\n', end + 1)) {
-    const auto start = content.rfind(' ', end) + 1;
-    messages += content.substr(start, end - start) + " ";
-  }
-  return messages;
-}
-
-std::size_t countOf(const std::string& text, const std::string& content) {
-  std::size_t count = 0;
-  for (auto at = content.find(text); at != std::string::npos; at = content.find(text, at + 1)) {
-    ++count;
-  }
-  return count;
-}
-
-DeviceJournal::DeviceJournal() : SimulatedDevice("BUS=no"), systemLog(root()) {
-  std::filesystem::create_directories(journals());
-}
-
-std::filesystem::path DeviceJournal::journals() const {
-  return (root() / simulator::kJournalFile).parent_path();
-}
-
-TestProcess DeviceJournal::startStoring(const std::string& name) const {
-  return TestProcess({JOURNAL_REMOTE, "-o", journals() / name, "-"});
-}
-
-void DeviceJournal::store(const std::string& name, const StoredEntries& entries) const {
-  auto storing = startStoring(name);
-  storing.write(exportFormat(entries));
+  TestProcess storing({JOURNAL_REMOTE, "-o", file, "-"});
+  storing.write(text);
   const auto result = storing.finish();
   ASSERT_EQ(result.status, 0) << result.errors;
 }
 
-Export DeviceJournal::run(const std::vector<std::string>& selection, const std::string& prelude,
-                          const std::string& history) {
-  std::vector<std::string> words = {history, output()};
-  words.insert(words.end(), selection.begin(), selection.end());
-  const auto [status, printed, errors] =
-      runLine("export TZ=UTC0; " + prelude + " '" OSLOG_EXPORT_PATH "' \"$@\"", words);
-  EXPECT_EQ(printed + errors, "");
-  const bool isFile = std::filesystem::is_regular_file(output());
-  return {status, isFile ? contentOf(output()) : "", messages()};
+std::string DeviceJournal::change(const std::string& line) const {
+  const auto result = runLine(inRoot(line));
+  EXPECT_EQ(result.errors, "") << line;
+  return result.output;
+}
+
+TestProcess DeviceJournal::startExport(std::vector<std::string> selection,
+                                       const std::string& prelude) const {
+  const auto line = inRoot("export TZ=UTC0; H=2147483647; O=/dev/stdout; " + prelude +
+                           " '" OSLOG_EXPORT_PATH "' $H $O \"$@\"");
+  selection.insert(selection.begin(), {"bash", "-c", line, "bash"});
+  return start(std::move(selection));
+}
+
+std::string DeviceJournal::finish(TestProcess& exporting) {
+  auto [status, text, errors] = exporting.finish();
+  for (const auto& message : systemLog.messages()) {
+    text += message + "\n";
+  }
+  return text + errors + (status == 0 ? "" : "status " + std::to_string(status) + "\n");
+}
+
+std::string DeviceJournal::run(const std::vector<std::string>& selection,
+                               const std::string& prelude) {
+  auto exporting = startExport(selection, "O=out.txt; " + prelude);
+  const auto told = finish(exporting);
+  const auto file = root() / "out.txt";
+  return (fs::is_regular_file(file) ? contentOf(file) : "") + told;
 }

@@ -5,10 +5,7 @@
 #include "tests/end_to_end/simulated_device.h"
 #include "tests/end_to_end/system_log_socket.h"
 
-#include <gtest/gtest.h>
-
 #include <filesystem>
-#include <ostream>
 #include <string>
 #include <utility>
 #include <vector>
@@ -27,64 +24,50 @@ simulator::JournalEntry message(long after, const std::string& text, Fields fiel
 StoredEntries entries(std::size_t count, const std::string& text, std::size_t after = 0,
                       std::size_t oneIn = 1);
 
-/// `entries` in the journal's export format.
-std::string exportFormat(const StoredEntries& entries);
+/// The last word of each line in `text`, with a blank behind it: a message that is one word.
+std::string lastWords(const std::string& text);
 
-/// The messages in `content`, which are single words here, with a blank behind each.
-std::string messagesOf(const std::string& content);
+/// What an export of the whole history tells the system log when it gets as far as the reader.
+inline const std::string kStarted = "Getting oslog stream: history = 2147483647.000000\n";
 
-/// How often `text` stands in `content`.
-std::size_t countOf(const std::string& text, const std::string& content);
-
-/// A history that reaches back to before everything the tests store.
-inline const std::string kAllOfHistory = "2147483647";
-
-/// What an export of it tells the system log when it gets as far as the reader.
-inline const std::vector kStarted = {"Getting oslog stream: history = " + kAllOfHistory +
-                                     ".000000"};
+/// The last word of it, see `lastWords`.
+inline const std::string kAll = "2147483647.000000 ";
 
 /// What it tells when something is missing besides.
-inline const std::vector<std::string> kIncomplete = {kStarted[0],
-                                                     "Invalid oslog stream: reason = 1"};
-
-/// What an export left behind.
-struct Export {
-  int status = 0;                                ///< Of the exporting process.
-  std::string content = {};                      ///< Of its file; empty when there is none to read.
-  std::vector<std::string> messages = kStarted;  ///< In the system log.
-
-  friend bool operator==(const Export&, const Export&) = default;
-  friend std::ostream& operator<<(std::ostream& stream, const Export& result) {
-    return stream << result.status << "\n"
-                  << result.content.substr(0, 5000) << testing::PrintToString(result.messages);
-  }
-};
+inline const std::string kIncomplete = kStarted + "Invalid oslog stream: reason = 1\n";
 
 /// A simulated device whose journals the test makes.
 class DeviceJournal : public SimulatedDevice {
  public:
-  DeviceJournal();
+  DeviceJournal() : SimulatedDevice("BUS=no"), systemLog(root()) {}
 
   /// Where the journal files are.
   [[nodiscard]] std::filesystem::path journals() const;
 
-  /// Where `run` has the export write to.
-  [[nodiscard]] std::filesystem::path output() const { return root() / "out.txt"; }
-
-  /// Makes the journal file `name` of `entries`. Rotates it behind an entry of very many fields.
+  /// Adds `entries` to the journal file `name`. Rotates it behind an entry of very many fields.
   void store(const std::string& name, const StoredEntries& entries) const;
 
-  /// Starts to store what is written to the process's input, in export format.
-  [[nodiscard]] TestProcess startStoring(const std::string& name) const;
+  /// Runs a line of the shell in the root, and returns its output. $J is where the journal files
+  /// are. Fails the test when the line complains.
+  std::string change(const std::string& line) const;
 
-  /// Exports with the words `selection`, in UTC. `prelude` is what the shell has in front of the
-  /// program: another zone, a limit, what runs it.
-  Export run(const std::vector<std::string>& selection = {"-p"}, const std::string& prelude = "",
-             const std::string& history = kAllOfHistory);
+  /// Starts an export to standard output with the words `selection`. `prelude` is what the shell,
+  /// in the root, has in front of the program: what runs it, a limit, a zone in place of UTC, $H in
+  /// place of a history that reaches back to before everything, $O in place of standard output.
+  /// $J is as in `change`.
+  [[nodiscard]] TestProcess startExport(std::vector<std::string> selection,
+                                        const std::string& prelude = "") const;
 
-  /// The messages in the system log since they were last asked for.
-  std::vector<std::string> messages() { return systemLog.messages(); }
+  /// Waits for the end of an export. Returns what it has written that was not taken before, the
+  /// lines that the system log got since the last call, and a status that is not 0.
+  std::string finish(TestProcess& exporting);
+
+  /// Exports to out.txt in the root. Returns that file's content and what `finish` does.
+  std::string run(const std::vector<std::string>& selection = {"-p"},
+                  const std::string& prelude = "");
 
  private:
+  [[nodiscard]] std::string inRoot(const std::string& line) const;
+
   SystemLogSocket systemLog;
 };
