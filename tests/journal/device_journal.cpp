@@ -15,9 +15,10 @@ StoredEntries entries(std::size_t count, const std::string& text, std::size_t af
                       std::size_t oneIn) {
   StoredEntries made;
   for (std::size_t at = 0; at < count; ++at) {
-    const auto program = at % oneIn == 0 ? text : "other";
-    made.push_back(
-        message(static_cast<long>(after + at), program, {{"_EXE", "/usr/bin/" + program}}));
+    made.push_back(message(static_cast<long>(after + at), text, {{"_EXE", "/usr/bin/" + text}}));
+    if (at % oneIn != 0) {
+      made.back().fields = {{"_EXE", "/usr/bin/other"}};
+    }
   }
   return made;
 }

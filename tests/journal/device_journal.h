@@ -19,8 +19,8 @@ inline constexpr LogTime kTime{std::chrono::microseconds(1'620'133'641'000'000)}
 /// An entry that is stored some microseconds after kTime. Its last field is its message.
 simulator::JournalEntry message(long after, const std::string& text, Fields fields = {});
 
-/// Entries a microsecond apart. One in `oneIn` is of the program `text`, the others of "other"; the
-/// program is the message, too.
+/// Entries a microsecond apart. One in `oneIn` is of the program `text`, which is its message, too;
+/// the others are of "other", and without a message.
 StoredEntries entries(std::size_t count, const std::string& text, std::size_t after = 0,
                       std::size_t oneIn = 1);
 

@@ -132,7 +132,7 @@ struct Selection {
 
 TEST(ExportProperty, IsWhatAPlainFilterGives) {
   Chance chance;
-  for (int journals = 0; journals < 16; ++journals) {
+  for (int journals = 0; journals < 12; ++journals) {
     DeviceJournal device;
     const auto stored = storeFiles(chance, device);
     for (int selections = 0; selections < 6; ++selections) {
