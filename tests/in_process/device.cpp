@@ -2,11 +2,10 @@
 
 #include "platform/compression.h"
 #include "platform/helper_client.h"
+#include "platform/manager_client.h"
 #include "platform/manager_names.h"
 #include "platform/program.h"
 #include "platform/telephony.h"
-
-#include <utility>
 
 using in_process::device;
 
@@ -45,9 +44,8 @@ std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::st
 }
 
 void vell::client::RegisterEventHandler(std::shared_ptr<Manager>, const std::string& eventName,
-                                        EventHandler handler) {
+                                        EventHandler) {
   device.clientCalls.push_back("RegisterEventHandler " + eventName);
-  device.handler = std::move(handler);
 }
 
 void vell::client::EventsOn(std::shared_ptr<Manager>) {

@@ -1,7 +1,5 @@
 #pragma once
 
-#include "platform/manager_client.h"
-
 #include <string>
 #include <vector>
 
@@ -15,7 +13,6 @@ struct Device {
   std::string programName = "velltool";
   std::string traceProperty;             ///< The manager's answer to any synchronous command.
   std::vector<std::string> clientCalls;  ///< What was done to the client of the manager.
-  vell::client::EventHandler handler;    ///< The one that was registered with it.
 };
 
 /// The device there is.
