@@ -27,11 +27,14 @@ TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
 }
 
 TEST(Output, HasEachLineOutBeforeTheNextIsBegun) {
-  const SimulatedDevice device("RADIO_TYPE=1\nBaseband.TraceEnabled=yes");
-  auto tool = device.start({VELLTOOL_PATH, "logdump", "tel", "--", "logdump", "core", "--",
-                            "logdump", "bb", "--", "help"});
-  const auto result = tool.finish();
-  EXPECT_TRUE(result.status == 0 && tool.wroteEachLineAtOnce()) << result;
+  for (const std::string profile :
+       {"TRACE_DUMP_STATE=answer", "TRACE_DUMP_STATE=status:1", "Baseband.TraceEnabled=no"}) {
+    const SimulatedDevice device("RADIO_TYPE=1\nBaseband.TraceEnabled=yes\n" + profile);
+    auto tool = device.start({VELLTOOL_PATH, "logdump", "tel", "--", "logdump", "core", "--",
+                              "logdump", "bb", "--", "help"});
+    const auto result = tool.finish();
+    EXPECT_TRUE(result.status == 0 && tool.wroteEachLineAtOnce()) << result;
+  }
 }
 
 TEST(StartUp, TakesNoSysrootWithRaisedPrivileges) {
