@@ -174,7 +174,7 @@ TEST(LiveJournal, IsReadAsFarAsItIsThereAtTheStartAndNotTakenAway) {
   }
   for (const std::string name : {"system.journal", "system@1.journal"}) {
     for (const auto& [change, hasAll, behind] : cases) {
-      for (const auto& selection : {std::vector{"-p"s}, {"-p", "old", "next", "last", "late"}}) {
+      for (const auto& selection : {std::vector{"-p"s}, {"-p", "old", "next", "last"}}) {
         SCOPED_TRACE(name + ", " + change + ", " + selection.back());
         const auto inFolder = "mkdir -p $J; cd $J; F=" + name + "; ";
         device.change(inFolder + "rm -f *; cp ../../stored/* .; mv old.journal $F");
@@ -182,7 +182,7 @@ TEST(LiveJournal, IsReadAsFarAsItIsThereAtTheStartAndNotTakenAway) {
         auto exporting = device.startExport(selection);
         exporting.readSome();
         device.change(inFolder + change);
-        device.store("user-1.journal", entries(1, "late", 1'000'002));
+        device.store("user-1.journal", entries(1, "last", 1'000'002));
         const auto words = lastWords(device.finish(exporting));
         ASSERT_TRUE(words.ends_with(behind)) << words.substr(words.size() - 50);
         const auto read = words.substr(0, words.size() - behind.size());
