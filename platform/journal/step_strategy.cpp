@@ -3,7 +3,7 @@
 #include <algorithm>
 
 void StepStrategy::noteStep(bool selected) {
-  constexpr std::size_t kIndexSteps = 512;
+  constexpr std::size_t kIndexSteps = 2048;
   constexpr std::size_t kFewestPlainSteps = 32;
   ++steps;
   selectedSteps += selected ? 1 : 0;

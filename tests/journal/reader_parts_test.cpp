@@ -76,13 +76,13 @@ TEST(StepStrategy, PicksTheIndexWhereFewEntriesAreSelected) {
   const struct {
     std::size_t matches, oneIn;  ///< Of so many entries one is selected.
     std::size_t byIndex;
-  } cases[] = {{0, 1000, 0}, {1, 1000, 5120}, {20, 33, 5120}, {1, 2, 5120},
-               {1, 1, 0},    {20, 5, 0},      {300, 33, 0},   {300, 1000, 3341}};
+  } cases[] = {{0, 1000, 0}, {1, 1000, 20480}, {20, 33, 20480}, {1, 2, 20480},
+               {1, 1, 0},    {20, 5, 0},       {300, 33, 0},    {300, 1000, 18101}};
   for (const auto& [matches, oneIn, byIndex] : cases) {
-    // Where the index is better, and its matches few, 32 plain steps take turns with 512 by it.
+    // Where the index is better, and its matches few, 32 plain steps take turns with 2048 by it.
     StepStrategy strategy(matches);
     std::size_t steps = 0;
-    for (std::size_t at = 0; at < std::size_t{10} * (32 + 512); ++at) {
+    for (std::size_t at = 0; at < std::size_t{10} * (32 + 2048); ++at) {
       strategy.noteStep(!strategy.isByIndex() && at % oneIn == 0);
       steps += strategy.isByIndex() ? 1 : 0;
     }
