@@ -8,20 +8,13 @@
 
 namespace {
 
-/// What stands behind "KEY=" in a cursor.
-std::string_view valueOf(std::string_view cursor, char key) {
-  const auto part = cursorPart(cursor, key);
-  return part.substr(std::min<std::size_t>(part.size(), 2));
-}
-
-bool readNumber(std::string_view digits, std::uint64_t& number) {
+/// Reads the number behind "KEY=" in a cursor. False when there is none.
+bool readNumber(std::string_view cursor, char key, std::uint64_t& number) {
   constexpr int kHexadecimal = 16;
+  const auto part = cursorPart(cursor, key);
+  const auto digits = part.substr(std::min<std::size_t>(part.size(), 2));
   const auto* const end = digits.data() + digits.size();
   return std::from_chars(digits.data(), end, number, kHexadecimal).ec == std::errc();
-}
-
-bool readId(std::string_view digits, sd_id128_t& id) {
-  return sd_id128_from_string(std::string(digits).c_str(), &id) >= 0;
 }
 
 }  // namespace
@@ -48,16 +41,16 @@ std::string_view cursorPart(std::string_view cursor, char key) {
 
 std::optional<JournalPlace> JournalPlace::fromCursor(std::string_view cursor) {
   JournalPlace place;
-  const bool whole = readId(valueOf(cursor, 's'), place.sequence) &&
-                     readNumber(valueOf(cursor, 'i'), place.number) &&
-                     readId(valueOf(cursor, 'b'), place.boot) &&
-                     readNumber(valueOf(cursor, 'm'), place.monotonic);
+  place.sequence = cursorPart(cursor, 's');
+  place.boot = cursorPart(cursor, 'b');
+  const bool whole =
+      readNumber(cursor, 'i', place.number) && readNumber(cursor, 'm', place.monotonic);
   return whole ? std::optional(place) : std::nullopt;
 }
 
 bool isStoredBefore(const JournalPlace& left, const JournalPlace& right) {
-  if (sd_id128_equal(left.sequence, right.sequence) != 0) {
+  if (left.sequence == right.sequence) {
     return left.number < right.number;
   }
-  return sd_id128_equal(left.boot, right.boot) != 0 && left.monotonic < right.monotonic;
+  return left.boot == right.boot && left.monotonic < right.monotonic;
 }

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <systemd/sd-id128.h>
 #include <systemd/sd-journal.h>
 
 #include <cstdint>
@@ -18,9 +17,9 @@ std::string_view cursorPart(std::string_view cursor, char key);
 /// Where an entry stands in the order of being stored, by counters that no setting of the clock
 /// affects. Damaged or forged files may hold any.
 struct JournalPlace {
-  sd_id128_t sequence{};  ///< Numbers the entries of the files that were rotated one to the next.
+  std::string sequence;  ///< Numbers the entries of the files that were rotated one to the next.
   std::uint64_t number = 0;     ///< In `sequence`.
-  sd_id128_t boot{};            ///< The system start during which the entry was made.
+  std::string boot;             ///< The system start during which the entry was made.
   std::uint64_t monotonic = 0;  ///< Since then, in microseconds.
 
   /// The place that a cursor tells; nullopt when it tells none.

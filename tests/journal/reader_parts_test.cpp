@@ -45,19 +45,15 @@ TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
 }
 
 TEST(JournalPlace, GoesByTheSequenceOrElseByTheBoot) {
-  const auto place = [](char sequence, const std::string& number, char boot,
-                        const std::string& time) {
-    return JournalPlace::fromCursor("s=" + std::string(32, sequence) + ";i=" + number +
-                                    ";b=" + std::string(32, boot) + ";m=" + time);
-  };
-  EXPECT_FALSE(place('s', "1", 'a', "1") || place('a', "", 'a', "1") ||
-               JournalPlace::fromCursor(""));
-  const auto left = place('a', "9", 'a', "1f").value();
-  EXPECT_TRUE(isStoredBefore(left, place('a', "a", 'a', "1e").value()));
-  EXPECT_FALSE(isStoredBefore(left, place('a', "9", 'a', "ff").value()));
-  EXPECT_TRUE(isStoredBefore(left, place('b', "1", 'a', "20").value()));
-  EXPECT_FALSE(isStoredBefore(left, place('b', "a", 'a', "1f").value()));
-  EXPECT_FALSE(isStoredBefore(left, place('b', "a", 'b', "20").value()));
+  const auto left = JournalPlace::fromCursor("s=a;i=9;b=a;m=1f").value();
+  for (const auto& [cursor, isAfter] : {std::pair("s=a;i=a;b=a;m=1e", true),
+                                        {"s=a;i=9;b=a;m=ff", false},
+                                        {"s=b;i=1;b=a;m=20", true},
+                                        {"s=b;i=a;b=a;m=1f", false},
+                                        {"s=b;i=a;b=b;m=20", false}}) {
+    EXPECT_EQ(isStoredBefore(left, JournalPlace::fromCursor(cursor).value()), isAfter) << cursor;
+  }
+  EXPECT_FALSE(JournalPlace::fromCursor("s=a;i=;b=a;m=1") || JournalPlace::fromCursor(""));
 }
 
 TEST(MachineTimeZone, IsWhatTheLibrarySaysAtAnyTime) {
