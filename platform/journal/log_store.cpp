@@ -8,6 +8,7 @@
 #include <csignal>
 #include <cstring>
 #include <exception>
+#include <future>
 #include <system_error>
 #include <thread>
 #include <utility>
@@ -41,50 +42,30 @@ void blockSignals() {
   pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
 }
 
-/// The reading thread: puts the selected entries into a queue. One that is destroyed early, because
-/// the delivering has failed, closes the queue first, as the thread may be waiting for room.
-class ReadingThread {
- public:
-  /// `into` and `filter` must live longer. Throws std::system_error when no thread can be had.
-  ReadingThread(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& into)
-      : queue(into), thread([this, &filter, from] { run(filter, from); }) {}
-  ReadingThread(const ReadingThread&) = delete;
-  ReadingThread& operator=(const ReadingThread&) = delete;
-  ~ReadingThread() {
-    if (thread.joinable()) {
-      queue.close();
-      thread.join();
-    }
-  }
-
-  /// Waits for the thread, after the queue has ended. Returns whether nothing is missing. To be
-  /// called once.
-  bool finish() {
-    thread.join();
-    return complete;
-  }
-
- private:
-  void run(const std::optional<LogFilter>& filter, LogTime from) {
-    try {
-      JournalReader reader(filter, from);
-      EntryBatch batch;
-      bool more = true;
-      while (more) {
-        more = reader.read(batch);
-        more = queue.push(batch) && more;
-      }
-      complete = reader.isComplete();
-    } catch (const std::exception&) {
-      // No memory is left, and what is not queued by now is missing.
-    }
-    queue.finish();
-  }
-
+/// Closes a queue when it goes: the reading thread may be waiting for room in it.
+struct ClosedAtEnd {
   BatchQueue& queue;
-  bool complete = false;  ///< The thread's until it has ended.
-  std::thread thread;
+  ~ClosedAtEnd() { queue.close(); }
 };
+
+/// The reading thread: puts the selected entries into `queue`. Returns whether nothing is missing.
+bool readAll(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& queue) {
+  bool complete = false;
+  try {
+    JournalReader reader(filter, from);
+    EntryBatch batch;
+    bool more = true;
+    while (more) {
+      more = reader.read(batch);
+      more = queue.push(batch) && more;
+    }
+    complete = reader.isComplete();
+  } catch (const std::exception&) {
+    // No memory is left, and what is not queued by now is missing.
+  }
+  queue.finish();
+  return complete;
+}
 
 }  // namespace
 
@@ -160,20 +141,20 @@ void LogReader::Session::end(unsigned long reason) {
 
 /// Delivers everything, or until the reader is stopped. Returns the reason of the end.
 unsigned long LogReader::Session::deliverAll(LogTime from) {
-  bool complete = false;
   try {
-    ReadingThread reading(filter, from, queue);
+    auto reading = std::async(std::launch::async, [&] { return readAll(filter, from, queue); });
+    const ClosedAtEnd closed{queue};
     EntryBatch batch;
     while (queue.pop(batch)) {
       for (std::size_t entry = 0; entry < batch.size() && !stopped; ++entry) {
         deliver(batch.valuesOf(entry), batch.realtimeOf(entry));
       }
     }
-    complete = reading.finish();
+    return reading.get() ? kLogReaderAtEnd : kLogReaderReadError;
   } catch (const std::exception&) {
     // No thread or no memory can be had.
+    return kLogReaderReadError;
   }
-  return complete ? kLogReaderAtEnd : kLogReaderReadError;
 }
 
 void LogReader::Session::deliver(const JournalValues& values, std::uint64_t realtime) {
