@@ -77,21 +77,16 @@ std::optional<JournalPlace> placeAfter(sd_journal* journal, int (*step)(sd_journ
   return step(journal) > 0 ? JournalPlace::fromCursor(cursorOf(journal)) : std::nullopt;
 }
 
-/// Takes file descriptors that nothing else can have while this lives.
-class SpareDescriptors {
- public:
-  explicit SpareDescriptors(std::size_t count) {
-    while (descriptors.size() < count) {
-      descriptors.emplace_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
-    }
-  }
-
-  /// Whether there were as many as wanted.
-  [[nodiscard]] bool isComplete() const { return static_cast<bool>(descriptors.back()); }
-
- private:
-  std::vector<FileDescriptor> descriptors;
-};
+/// Raises the soft limit of open files, which is kept low for programs that use select(2), as far
+/// as it can be. Returns how many files may be held open: half of it, which leaves the rest to the
+/// process.
+std::size_t raiseFileLimit() {
+  struct rlimit limit {};
+  getrlimit(RLIMIT_NOFILE, &limit);
+  limit.rlim_cur = limit.rlim_max;
+  setrlimit(RLIMIT_NOFILE, &limit);
+  return std::max<std::size_t>(limit.rlim_cur / 2, 1);
+}
 
 class Finder {
  public:
@@ -161,10 +156,9 @@ class Finder {
     }
   }
 
-  /// Gives up the files that end first until there are descriptors for one more file: itself, and
-  /// the second that opening its journal takes.
+  /// Gives up the file that ends first when there are more than may be held open.
   void makeRoom() {
-    while (files.found.size() > 1 && !SpareDescriptors(2).isComplete()) {
+    if (files.found.size() > mostOpen) {
       files.found.erase(std::min_element(files.found.begin(), files.found.end(),
                                          [](const JournalFile& left, const JournalFile& right) {
                                            return left.stored.last < right.stored.last;
@@ -189,42 +183,11 @@ class Finder {
 
   std::uint64_t from;
   std::size_t atMost;
+  std::size_t mostOpen = raiseFileLimit();
   std::set<std::pair<dev_t, ino_t>> known;  ///< The regular files that were opened.
 };
 
-/// Journal files stay open while they wait to be read, and there may be more of them than the soft
-/// limit allows. That is kept low for programs that use select(2).
-void raiseFileLimit() {
-  struct rlimit limit {};
-  if (getrlimit(RLIMIT_NOFILE, &limit) == 0 && limit.rlim_cur < limit.rlim_max) {
-    limit.rlim_cur = limit.rlim_max;
-    setrlimit(RLIMIT_NOFILE, &limit);
-  }
-}
-
-}  // namespace
-
-std::uint64_t journalTime(LogTime time) {
-  return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
-}
-
-JournalFiles findJournalFiles(std::uint64_t from, std::size_t atMost) {
-  raiseFileLimit();
-  // However many files there are, some descriptors are left for the rest of the process.
-  constexpr std::size_t kHeldBack = 8;
-  const SpareDescriptors heldBack(kHeldBack);
-  Finder finder(from, atMost);
-  while (finder.findNewFiles()) {
-  }
-  auto& found = finder.files.found;
-  std::stable_sort(found.begin(), found.end(),
-                   [](const JournalFile& left, const JournalFile& right) {
-                     return left.stored.first < right.stored.first;
-                   });
-  findOverlaps(found);
-  return std::move(finder.files);
-}
-
+/// Notes for each file the span that it shares with others. `files`: by when they start.
 void findOverlaps(std::vector<JournalFile>& files) {
   for (auto file = files.begin(); file != files.end(); ++file) {
     for (auto later = file + 1; later != files.end() && later->stored.first <= file->stored.last;
@@ -235,6 +198,25 @@ void findOverlaps(std::vector<JournalFile>& files) {
       }
     }
   }
+}
+
+}  // namespace
+
+std::uint64_t journalTime(LogTime time) {
+  return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
+}
+
+JournalFiles findJournalFiles(std::uint64_t from, std::size_t atMost) {
+  Finder finder(from, atMost);
+  while (finder.findNewFiles()) {
+  }
+  auto& found = finder.files.found;
+  std::stable_sort(found.begin(), found.end(),
+                   [](const JournalFile& left, const JournalFile& right) {
+                     return left.stored.first < right.stored.first;
+                   });
+  findOverlaps(found);
+  return std::move(finder.files);
 }
 
 JournalPtr openJournal(FileDescriptor file) {

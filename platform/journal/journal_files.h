@@ -55,13 +55,9 @@ struct JournalFiles {
 /// name. Leaves out files that end before `from`, in microseconds. Stops after `atMost` files.
 ///
 /// Raises the process's soft limit of open files to the hard limit. When there are more files than
-/// that allows, the files that end first are given up, which counts as damage. From any thread.
+/// half of that, the files that end first are given up, which counts as damage. From any thread.
 JournalFiles findJournalFiles(std::uint64_t from,
                               std::size_t atMost = std::numeric_limits<std::size_t>::max());
-
-/// Notes for each file, which are in the order of their first entries, the span that it shares with
-/// others.
-void findOverlaps(std::vector<JournalFile>& files);
 
 /// Opens the journal in `file`. Null when that fails; errno is then set, but not for want of a
 /// `file`. Survives lost pages of the file, see `surviveLostPages`. Used on the thread that closes
