@@ -202,10 +202,6 @@ void findOverlaps(std::vector<JournalFile>& files) {
 
 }  // namespace
 
-std::uint64_t journalTime(LogTime time) {
-  return static_cast<std::uint64_t>(std::max<LogTime::rep>(time.time_since_epoch().count(), 1));
-}
-
 JournalFiles findJournalFiles(std::uint64_t from, std::size_t atMost) {
   Finder finder(from, atMost);
   while (finder.findNewFiles()) {

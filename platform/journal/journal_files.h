@@ -1,6 +1,5 @@
 #pragma once
 
-#include "platform/clock.h"
 #include "platform/journal/journal_place.h"
 #include "platform/portable/handle.h"
 #include "platform/posix/file_descriptor.h"
@@ -15,9 +14,6 @@
 
 /// Owns an open journal, which one thread opens, uses and closes, see sd-journal(3).
 using JournalPtr = HandlePtr<sd_journal, sd_journal_close>;
-
-/// `time` as the journal counts it: microseconds, of which 0 stands for no time.
-std::uint64_t journalTime(LogTime time);
 
 /// From when to when, in microseconds, both included. Empty when `last` is before `first`.
 struct TimeSpan {

@@ -8,10 +8,7 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <optional>
-#include <queue>
-#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -31,40 +28,31 @@ class JournalReader {
   [[nodiscard]] bool isComplete() const { return complete; }
 
  private:
-  /// A file, and what it has to wait for.
+  /// A file that has entries left, and how many such files were stored before it.
   struct Source {
-    explicit Source(JournalFileIterator waiting) : iterator(std::move(waiting)) {}
-
     JournalFileIterator iterator;
-    std::size_t openPredecessors = 0;  ///< Files that were stored before it and are not closed.
+    std::size_t openPredecessors = 0;
   };
 
-  /// A file waits for its turn, which comes when its next entry is the oldest.
-  struct Turn {
-    std::uint64_t reached = 0;
-    std::size_t file = 0;  ///< Its place in `sources`.
-    bool operator>(const Turn& other) const {
-      return std::tie(reached, file) > std::tie(other.reached, other.file);
-    }
-  };
+  /// Files take turns in the order of these: whether the file has to wait for others, and the
+  /// latest time that it has come to. Files that wait for each other, as damaged or forged ones may
+  /// do, come last.
+  using Turn = std::pair<bool, std::uint64_t>;
 
   bool readEntry(EntryBatch& batch);
   [[nodiscard]] bool isSelected(const EntryBatch& batch) const;
   bool isDuplicate();
   void advance(bool selected);
   bool takeTurn();
-  [[nodiscard]] Turn turnOf(std::size_t file) const;
-  void waitForTurn(std::size_t file);
-  void end(std::size_t file);
-  bool releaseOne();
-  [[nodiscard]] bool precedes(std::size_t left, std::size_t right) const;
+  void end(std::vector<Source>::iterator file);
+  static Turn turnOf(const Source& file);
+  static bool precedes(const Source& left, const Source& right);
 
   LogSelection selection;
   LogTime start;
-  std::vector<Source> sources;  ///< One for each file, in the order of the files.
-  /// The next turn on top. Without files that are closed, are current or have open predecessors.
-  std::priority_queue<Turn, std::vector<Turn>, std::greater<>> turns;
-  std::optional<std::size_t> current;  ///< The file whose turn it is.
+  std::vector<Source> sources;  ///< By when they start.
+  Source* current = nullptr;    ///< The file whose turn it is, if any.
+  Turn nextTurn;                ///< The first one of the other files.
   DuplicateFilter duplicates;
   bool complete;
 };

@@ -89,7 +89,7 @@ TEST(ExportOrder, HasAllOfFilesThatSeemToComeBeforeEachOther) {
   DeviceJournal device;
   device.store("system@1.journal", {message(10, "a"), message(5, "b")});
   device.store("system@2.journal", {message(8, "c"), message(6, "d")});
-  EXPECT_EQ(lastWords(device.run()), "a b c d " + kAll);
+  EXPECT_EQ(lastWords(device.run()), "c d a b " + kAll);
 }
 
 }  // namespace
