@@ -21,7 +21,7 @@
 //     the index has nothing behind it;
 //   - in a live file: the entry that the header names as last is not newer than the one found;
 //   - in any other: the last entry has the time that the header names;
-//   - always: the library still has the file, and no page of it was lost.
+//   - always: the library still has the file.
 // If an index fails the check, its file is opened again and walked plainly behind the entry that
 // was reached. Whatever fails, `damaged` says that entries may be missing.
 //
@@ -60,28 +60,26 @@ JournalFileIterator::JournalFileIterator(JournalFile journalFile, std::uint64_t 
     : file(std::move(journalFile)), earliest(from), latest(std::max(file.stored.first, from)) {}
 
 void JournalFileIterator::start(const LogSelection& selection) {
-  const LostPageWatch watch;
-  if (reopen()) {
-    damaged = file.isLive && !fixEndOfFile();
-    const auto answer = askIndex(selection);
-    if (answer == Answer::Damaged) {
-      goOnWithoutIndex(0);
-    } else if (answer == Answer::NoneSelected || (!end.cursor.empty() && end.realtime < earliest)) {
-      close(true);
-    } else if (!goToFirst()) {
-      close(timeOfLast(journal.get()) < earliest);
-    }
-  } else {
+  if (!open()) {
     close(false);
+    return;
   }
-  damaged = damaged || watch.sawLoss();
+  // By its header. What is added meanwhile is newer.
+  const auto last = timeOfLast(journal.get());
+  damaged = file.isLive && !(fixEnd() && last <= end.realtime);
+  const auto answer = askIndex(selection);
+  if (answer == Answer::Damaged) {
+    goOnWithoutIndex(0);
+  } else if (answer == Answer::NoneSelected || (!end.cursor.empty() && end.realtime < earliest)) {
+    close(true);
+  } else if (!goToFirst()) {
+    close(timeOfLast(journal.get()) < earliest);
+  }
 }
 
-/// Opens the file, which can be repeated while there are file descriptors to be had.
-bool JournalFileIterator::reopen() {
-  auto spare = file.file.duplicate();
-  journal = openJournal(std::move(file.file));
-  file.file = std::move(spare);
+/// Opens the journal, or opens it again.
+bool JournalFileIterator::open() {
+  journal = openJournal(file.file.duplicate());
   return journal != nullptr;
 }
 
@@ -93,13 +91,6 @@ bool JournalFileIterator::fixEnd() {
   }
   end.cursor = cursor();
   return !end.cursor.empty();
-}
-
-/// Fixes the last entry of the file as the end. False when there should be a newer one, by the
-/// file's header: the end of the file is damaged.
-bool JournalFileIterator::fixEndOfFile() {
-  const auto last = timeOfLast(journal.get());
-  return fixEnd() && last <= end.realtime;
 }
 
 /// Looks up `selection` in the index, and fixes the end by it. The index of a file that was not
@@ -127,7 +118,7 @@ JournalFileIterator::Answer JournalFileIterator::askIndex(const LogSelection& se
 
 bool JournalFileIterator::read(EntryBatch& batch) {
   batch.begin(current);
-  const LostPageWatch watch;
+  const auto lost = lostPages();
   const void* data = nullptr;
   std::size_t length = 0;
   sd_journal_restart_data(journal.get());
@@ -135,7 +126,7 @@ bool JournalFileIterator::read(EntryBatch& batch) {
   for (; more > 0; more = sd_journal_enumerate_data(journal.get(), &data, &length)) {
     addItem({static_cast<const char*>(data), length}, batch);
   }
-  const bool whole = more == 0 && !watch.sawLoss();
+  const bool whole = more == 0 && lostPages() == lost;
   if (!whole) {
     batch.dropLast();
     damaged = true;
@@ -144,14 +135,11 @@ bool JournalFileIterator::read(EntryBatch& batch) {
 }
 
 std::string JournalFileIterator::cursor() {
-  const LostPageWatch watch;
-  auto text = cursorOf(journal.get());
-  damaged = damaged || watch.sawLoss();
-  return text;
+  return cursorOf(journal.get());
 }
 
 void JournalFileIterator::advance(bool selected) {
-  const LostPageWatch watch;
+  const auto lost = lostPages();
   const auto left = current;
   if (state == State::AtEnd) {
     if (!index.isUsed() || isEndOfIndex()) {
@@ -160,14 +148,14 @@ void JournalFileIterator::advance(bool selected) {
     }
   } else {
     index.chooseNextStep(journal.get(), selected);
-    if (goToNext() && !watch.sawLoss()) {
+    if (goToNext() && lostPages() == lost) {
       return;
     }
   }
   if (index.isUsed()) {
     goOnWithoutIndex(left);
   } else {
-    close(isEndOfFile() && !watch.sawLoss());
+    close(isEndOfFile());
   }
 }
 
@@ -207,7 +195,7 @@ void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
   damaged = true;
   index = JournalIndex();
   end = End();
-  bool found = reopen() && (!file.isLive || fixEnd()) && goToFirst();
+  bool found = open() && (!file.isLive || fixEnd()) && goToFirst();
   while (found && current <= left) {
     found = state == State::Walking && goToNext();
   }

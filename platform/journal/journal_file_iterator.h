@@ -61,9 +61,8 @@ class JournalFileIterator {
   /// What the index says about a selection.
   enum class Answer { NoneSelected, Walk, Damaged };
 
-  bool reopen();
+  bool open();
   bool fixEnd();
-  bool fixEndOfFile();
   Answer askIndex(const LogSelection& selection);
   bool isEndOfIndex();
   bool isEndOfFile();

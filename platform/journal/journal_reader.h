@@ -5,6 +5,7 @@
 #include "platform/journal/entry_batch.h"
 #include "platform/journal/journal_file_iterator.h"
 #include "platform/journal/log_selection.h"
+#include "platform/journal/lost_pages.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -14,7 +15,7 @@
 
 /// Reads the selected entries of the device's journal files, from a point in time to what is stored
 /// when the reader is made, and merges them in the order of being stored, without duplicates. On
-/// one thread.
+/// one thread, which reads no other journal.
 class JournalReader {
  public:
   /// Finds the files. Without a filter every entry is selected.
@@ -25,7 +26,7 @@ class JournalReader {
   bool read(EntryBatch& batch);
 
   /// Whether nothing is missing from what was read.
-  [[nodiscard]] bool isComplete() const { return complete; }
+  [[nodiscard]] bool isComplete() const { return complete && lostPages() == 0; }
 
  private:
   /// A file that has entries left, and how many such files were stored before it.

@@ -6,15 +6,6 @@
 /// causes of the signal, get what they would have got without it.
 void surviveLostPages();
 
-/// How many pages this thread has lost so far.
+/// How many pages this thread has lost so far. What was read while one was lost is not to be relied
+/// on.
 unsigned long lostPages();
-
-/// Tells whether this thread has lost a page since the object was made. What was read meanwhile
-/// is then not to be relied on.
-class LostPageWatch {
- public:
-  [[nodiscard]] bool sawLoss() const { return lostPages() != before; }
-
- private:
-  unsigned long before = lostPages();
-};
