@@ -6,7 +6,7 @@
 #include "logdump/logdump_command.h"
 #include "logdump/os_log_handler.h"
 #include "logdump/system_logs_trace.h"
-#include "logdump/trace_flag.h"
+#include "logdump/trace_value.h"
 #include "tests/fuzz/fuzz_target.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"

@@ -1,0 +1,14 @@
+#pragma once
+
+#include <optional>
+#include <string>
+
+/// The mode that the value of a trace property stands for. A word, in any letter case: off is 0, on
+/// or full is 1, lite is 2. Else the number that the whole of `text` spells, as std::stoi reads it
+/// with base 0: leading white space and a sign, then decimal, 0x for hexadecimal or 0 for octal.
+/// nullopt when `text` is neither, or does not fit an int. From any thread.
+std::optional<int> parseTraceMode(const std::string& text);
+
+/// Sets `flag` to whether `text` stands for another mode than 0. `flag` stays as it is when `text`
+/// stands for none. From any thread.
+void parseTraceFlag(const std::string& text, bool& flag);
