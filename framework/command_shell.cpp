@@ -86,13 +86,16 @@ CommandShell::GroupEnd CommandShell::executeGroup(std::list<std::string> words) 
     if (word == "cd") {
       return endWith(changeNode(words));
     }
-    if (currentNode->isValidCommand(word)) {
-      return endWith(runHandler(word, std::move(words)));
+    const bool isHandler = currentNode->isValidCommand(word);
+    const auto child = currentNode->getSubCommandObj(word);
+    if ((isHandler || child) && !currentNode->isAllowed(word)) {
+      return GroupEnd::failed;
     }
-    if (currentNode->isValidSubCommand(word)) {
-      if (!enterSubCommand(word)) {
-        return GroupEnd::failed;
-      }
+    if (isHandler) {
+      return endWith(currentNode->execCommand(word, std::move(words)));
+    }
+    if (child) {
+      currentNode = child;
       if (lastWord) {
         currentNode->displayHelp();
         return GroupEnd::failed;
@@ -114,18 +117,6 @@ CommandShell::GroupEnd CommandShell::executeGroup(std::list<std::string> words) 
     return GroupEnd::failed;
   }
   return GroupEnd::succeeded;
-}
-
-bool CommandShell::runHandler(const std::string& word, std::list<std::string> args) {
-  return currentNode->isAllowed(word) && currentNode->execCommand(word, std::move(args));
-}
-
-bool CommandShell::enterSubCommand(const std::string& word) {
-  if (!currentNode->isAllowed(word)) {
-    return false;
-  }
-  currentNode = currentNode->getSubCommandObj(word);
-  return true;
 }
 
 bool CommandShell::changeNode(const std::list<std::string>& operands) {

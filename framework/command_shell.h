@@ -38,8 +38,6 @@ class CommandShell {
       const std::list<std::string>& words);
   GroupEnd executeGroups(const std::vector<std::list<std::string>>& groups);
   GroupEnd executeGroup(std::list<std::string> words);
-  bool runHandler(const std::string& word, std::list<std::string> args);
-  bool enterSubCommand(const std::string& word);
   bool changeNode(const std::list<std::string>& operands);
   void goBack();
   void showInvalidWord(const std::string& word);
