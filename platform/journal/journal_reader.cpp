@@ -14,7 +14,8 @@ JournalReader::JournalReader(const std::optional<LogFilter>& filter, LogTime fro
   auto files = findJournalFiles(earliest);
   complete = !files.damaged;
   for (auto& found : files.found) {
-    auto& iterator = sources.emplace_back(JournalFileIterator(std::move(found), earliest)).iterator;
+    sources.push_back({JournalFileIterator(std::move(found), earliest)});
+    auto& iterator = sources.back().iterator;
     // The end of a live file is fixed now. Any other file is opened when its turn comes.
     if (iterator.journalFile().isLive) {
       iterator.start(selection);
