@@ -42,12 +42,6 @@ void blockSignals() {
   pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
 }
 
-/// Closes a queue when it goes: the reading thread may be waiting for room in it.
-struct ClosedAtEnd {
-  BatchQueue& queue;
-  ~ClosedAtEnd() { queue.close(); }
-};
-
 /// The reading thread: puts the selected entries into `queue`. Returns whether nothing is missing.
 bool readAll(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& queue) {
   bool complete = false;
@@ -88,6 +82,7 @@ class LogReader::Session {
  private:
   void run(LogTime from);
   unsigned long deliverAll(LogTime from);
+  bool deliverQueued();
   void deliver(const JournalValues& values, std::uint64_t realtime);
   void end(unsigned long reason);
 
@@ -139,21 +134,32 @@ void LogReader::Session::end(unsigned long reason) {
   }
 }
 
-/// Delivers everything, or until the reader is stopped. Returns the reason of the end.
+/// Reads and delivers everything, or until the reader is stopped. Returns the reason of the end.
 unsigned long LogReader::Session::deliverAll(LogTime from) {
   try {
     auto reading = std::async(std::launch::async, [&] { return readAll(filter, from, queue); });
-    const ClosedAtEnd closed{queue};
+    const bool delivered = deliverQueued();
+    return reading.get() && delivered ? kLogReaderAtEnd : kLogReaderReadError;
+  } catch (const std::exception&) {
+    // No thread can be had.
+    return kLogReaderReadError;
+  }
+}
+
+/// Delivers until the queue ends. False when no memory is left.
+bool LogReader::Session::deliverQueued() {
+  try {
     EntryBatch batch;
     while (queue.pop(batch)) {
       for (std::size_t entry = 0; entry < batch.size() && !stopped; ++entry) {
         deliver(batch.valuesOf(entry), batch.realtimeOf(entry));
       }
     }
-    return reading.get() ? kLogReaderAtEnd : kLogReaderReadError;
+    return true;
   } catch (const std::exception&) {
-    // No thread or no memory can be had.
-    return kLogReaderReadError;
+    // The reading thread may be waiting for room.
+    queue.close();
+    return false;
   }
 }
 
