@@ -53,7 +53,7 @@ void DeviceJournal::store(const std::string& name, const StoredEntries& entries)
   ASSERT_EQ(result.status, 0) << result.errors;
 }
 
-std::string DeviceJournal::change(const std::string& line) const {
+std::string DeviceJournal::change(const std::string& line) {
   const auto result = runLine(inRoot(line));
   EXPECT_EQ(result.errors, "") << line;
   return result.output;

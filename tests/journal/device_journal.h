@@ -49,7 +49,7 @@ class DeviceJournal : public SimulatedDevice {
 
   /// Runs a line of the shell in the root, and returns its output. $J is where the journal files
   /// are. Fails the test when the line complains.
-  std::string change(const std::string& line) const;
+  std::string change(const std::string& line);
 
   /// Starts an export to standard output with the words `selection`. `prelude` is what the shell,
   /// in the root, has in front of the program: what runs it, a limit, a zone in place of UTC, $H in

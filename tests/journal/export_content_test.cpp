@@ -8,7 +8,6 @@
 
 namespace {
 
-namespace fs = std::filesystem;
 using namespace std::string_literals;
 
 // In a zone that is five hours and three quarters ahead.

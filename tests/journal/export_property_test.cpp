@@ -72,7 +72,7 @@ ModelEntry makeEntry(Chance& chance, long after, const std::string& text, std::s
 
 /// Stores journals whose entries lie between each other's and are, perhaps, stored twice; some are
 /// written to no more. Returns the entries, the oldest first.
-std::vector<ModelEntry> storeFiles(Chance& chance, const DeviceJournal& device) {
+std::vector<ModelEntry> storeFiles(Chance& chance, DeviceJournal& device) {
   constexpr long kMinute = 60'000'000;
   std::vector<ModelEntry> all;
   for (auto file = static_cast<long>(chance() % 6); file >= 0; --file) {
