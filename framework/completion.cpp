@@ -2,6 +2,7 @@
 
 #include "framework/command_path.h"
 
+#include <algorithm>
 #include <set>
 
 namespace {
@@ -31,30 +32,24 @@ std::set<std::string> wordsAt(const CommandBase& node, Next next) {
 }  // namespace
 
 Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const std::string& text) {
-  auto words = splitAtWhiteSpace(text);
-  std::string typed;
-  if (!words.empty() && text.ends_with(words.back())) {
-    typed = words.back();
-    words.pop_back();
-  }
+  auto typed = text.substr(text.find_last_of(" \t\n\v\f\r") + 1);
+  auto words = splitAtWhiteSpace(text.substr(0, text.size() - typed.size()));
+  words.erase(words.begin(), std::find(words.rbegin(), words.rend(), "--").base());
   auto node = promptNode;  // Null behind the words of a handler, and of nothing.
   auto next = Next::firstWord;
   for (const auto& word : words) {
-    if (word == "--") {
-      node = promptNode;
-      next = Next::firstWord;
-    } else if (node && next != Next::path && word == "cd") {
+    if (next != Next::path && word == "cd") {
       next = Next::path;
-    } else if (node) {
-      const bool ends = next == Next::path || node->isValidCommand(word);
+    } else {
+      const bool ends = !node || next == Next::path || node->isValidCommand(word);
       node = ends ? nullptr : node->getSubCommandObj(word);
       next = Next::laterWord;
     }
   }
-  if (const auto slash = typed.rfind('/');
-      node && next == Next::path && slash != std::string::npos) {
-    node = followPath(node, typed.substr(0, slash)) ? node : nullptr;
-    typed.erase(0, slash + 1);
+  if (node && next == Next::path) {
+    const auto pathEnd = typed.rfind('/') + 1;  // 0 without a slash.
+    node = followPath(node, typed.substr(0, pathEnd)) ? node : nullptr;
+    typed.erase(0, pathEnd);
   }
   Completions completions{typed.size(), {}};
   for (const auto& word : node ? wordsAt(*node, next) : std::set<std::string>()) {
