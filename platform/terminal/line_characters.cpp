@@ -47,12 +47,12 @@ wchar_t joinMark(wchar_t before, wchar_t character) {
 
 std::optional<std::wstring> toCharacters(const std::string& text) {
   std::wstring decoded(text.size(), L'\0');
-  if (std::mbstowcs(decoded.data(), text.c_str(), text.size()) > text.size()) {
+  const auto length = std::mbstowcs(decoded.data(), text.c_str(), text.size());
+  if (length > text.size()) {
     return std::nullopt;
   }
-  decoded.resize(std::wcslen(decoded.c_str()));
   std::wstring characters;
-  for (const auto character : decoded) {
+  for (const auto character : decoded.substr(0, length)) {
     const auto joined = joinMark(characters.empty() ? L'\0' : characters.back(), character);
     if (joined == 0 || std::iswprint(static_cast<std::wint_t>(character)) == 0) {
       return std::nullopt;
