@@ -11,7 +11,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <clocale>
-#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cwchar>
@@ -24,9 +23,11 @@ namespace {
 
 // What libedit's calls back need, on the thread that reads.
 HistoryW* lineHistory = nullptr;
+HistEventW historyEvent{};
 std::wstring shownPrompt;
 const Completer* completer = nullptr;
-std::size_t columns = 0;              ///< Of the screen, when it was last looked at.
+int columns = 0;                      ///< Of the screen, when it was last looked at.
+int typedEarly = 0;                   ///< Bytes to come from before the terminal was set.
 std::optional<std::wstring> lastTab;  ///< The line up to the cursor when Tab last added nothing.
 
 /// Takes what libedit writes, see fopencookie(3). A character may come in pieces.
@@ -46,33 +47,24 @@ ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   return static_cast<ssize_t>(count);
 }
 
-std::wstring lineToCursor(EditLine* editor) {
-  const auto* const line = el_wline(editor);
-  return {line->buffer, line->cursor};
-}
-
 /// Looks how wide the screen is; whether that has changed.
 bool hasNewWidth() {
   winsize window{};
   ioctl(STDOUT_FILENO, TIOCGWINSZ, &window);
-  return std::exchange(columns, std::max<std::size_t>(window.ws_col, 1)) != columns;
-}
-
-/// Rows of the screen above the one in which the prompt and `line` end.
-std::size_t rowsAbove(const std::wstring& line) {
-  std::size_t cells = 0;
-  for (const auto character : shownPrompt + line) {
-    const auto width = static_cast<std::size_t>(wcwidth(character) < 0 ? 2 : wcwidth(character));
-    const auto left = columns - cells % columns;
-    cells += width > left ? left + width : width;
-  }
-  return cells / columns;
+  return std::exchange(columns, std::max<int>(window.ws_col, 1)) != columns;
 }
 
 /// Takes the prompt and the line off the screen: a terminal wraps them anew when its width changes.
 /// See console_codes(4).
 void eraseLine(EditLine* editor) {
-  for (auto rows = rowsAbove(lineToCursor(editor)); rows > 0; --rows) {
+  const auto* const line = el_wline(editor);
+  int cells = 0;
+  for (const auto character : shownPrompt + std::wstring(line->buffer, line->cursor)) {
+    const int width = wcwidth(character) < 0 ? 2 : wcwidth(character);
+    const int left = columns - cells % columns;
+    cells += width > left ? left + width : width;
+  }
+  for (; cells >= columns; cells -= columns) {
     std::cout << "\x1b[A";
   }
   std::cout << "\r\x1b[J";
@@ -82,10 +74,10 @@ void eraseLine(EditLine* editor) {
 ssize_t readByte(EditLine* editor, char& byte) {
   while (true) {
     std::cout.flush();
-    const int signal = waitForTerminal();
-    if (hasNewWidth() || signal != 0) {
-      // A key may have come before the signal.
-      if (signal == 0 || signal == SIGWINCH) {
+    bool wasStopped = false;
+    const bool isReadable = waitForTerminal(wasStopped);
+    if (hasNewWidth() || wasStopped) {
+      if (!wasStopped) {
         eraseLine(editor);
       }
       std::cout << '\r';
@@ -93,7 +85,11 @@ ssize_t readByte(EditLine* editor, char& byte) {
       el_wset(editor, EL_PREP_TERM, 1);
       el_resize(editor);
       el_wset(editor, EL_REFRESH);
-    } else if (const auto count = read(STDIN_FILENO, &byte, 1); count >= 0 || errno != EAGAIN) {
+    } else if (isReadable) {
+      const auto count = read(STDIN_FILENO, &byte, 1);
+      // Ctrl-D that was typed early has become null, which is else what Ctrl-Space types.
+      byte = byte == '\0' && typedEarly > 0 ? CEOF : byte;
+      typedEarly = std::max(typedEarly - 1, 0);
       return count;
     }
   }
@@ -101,48 +97,41 @@ ssize_t readByte(EditLine* editor, char& byte) {
 
 /// Gives libedit the next character that is typed: 1, 0 at the end of input, -1 after an error.
 int readCharacter(EditLine* editor, wchar_t* character) {
+  const auto* const line = el_wline(editor);
   std::mbstate_t state{};
-  while (true) {
+  for (*character = 0; *character == 0;) {
     char byte = 0;
     if (const auto count = readByte(editor, byte); count <= 0) {
       return static_cast<int>(count);
     }
-    wchar_t typed = 0;
-    auto length = std::mbrtowc(&typed, &byte, 1, &state);
-    if (length == static_cast<std::size_t>(-1)) {
+    wchar_t typed = 0;  // Also while a character is not complete.
+    if (std::mbrtowc(&typed, &byte, 1, &state) == static_cast<std::size_t>(-1)) {
       // What came before was cut short, or this is nothing.
       state = {};
-      length = std::mbrtowc(&typed, &byte, 1, &state);
+      std::mbrtowc(&typed, &byte, 1, &state);
     }
-    if (length <= 1) {
-      const auto* const line = el_wline(editor);
-      // Null is what Ctrl-D becomes where it is typed before the terminal is set for editing.
-      if ((typed == CEOF || typed == 0) && line->lastchar == line->buffer) {
-        return 0;
-      }
-      *character = joinMark(line->cursor == line->buffer ? L'\0' : line->cursor[-1], typed);
-      if (*character != 0 && *character != typed) {
-        // libedit shall not find on the screen what it has not drawn.
-        eraseLine(editor);
-        el_deletestr(editor, 1);
-        el_wset(editor, EL_REFRESH);
-      }
-      if (*character != 0) {
-        return 1;
-      }
+    if (typed == CEOF && line->lastchar == line->buffer) {
+      return 0;
+    }
+    *character = joinMark(line->cursor == line->buffer ? L'\0' : line->cursor[-1], typed);
+    if (*character != 0 && *character != typed) {
+      // libedit shall not find on the screen what it has not drawn.
+      eraseLine(editor);
+      el_deletestr(editor, 1);
+      el_wset(editor, EL_REFRESH);
     }
   }
+  return 1;
 }
 
 unsigned char completeWord(EditLine* editor, int /*key*/) {
-  const auto before = lineToCursor(editor);
+  const auto* const line = el_wline(editor);
+  const std::wstring before(line->buffer, line->cursor);
   auto [typed, words] = (*completer)(toText(before));
   std::erase_if(words, [](const auto& word) { return !toCharacters(word); });
   auto common = words.empty() ? "" : words.front();
-  for (const auto& word : words) {
-    const auto same = std::mismatch(common.begin(), common.end(), word.begin(), word.end());
-    common.erase(same.first, common.end());
-  }
+  const auto& last = words.empty() ? common : words.back();
+  common.erase(std::ranges::mismatch(common, last).in1, common.end());
   common.erase(0, typed);
   while (!toCharacters(common)) {
     common.pop_back();
@@ -173,8 +162,7 @@ EditLine* makeEditor() {
   auto* const editor = el_init_fd("", stdin, screen, fopencookie(nullptr, "w", {}), STDIN_FILENO,
                                   STDOUT_FILENO, STDERR_FILENO);
   lineHistory = history_winit();
-  HistEventW event{};
-  history_w(lineHistory, &event, H_SETSIZE, 1000);
+  history_w(lineHistory, &historyEvent, H_SETSIZE, 1000);
   el_wset(editor, EL_HIST, history_w, lineHistory);
   el_wset(
       editor, EL_PROMPT, +[](EditLine*) { return shownPrompt.data(); });
@@ -184,6 +172,7 @@ EditLine* makeEditor() {
   el_set(editor, EL_BIND, "^I", "complete", nullptr);
   // Between lines, what is typed is not shown and waits for the editor as it is.
   el_set(editor, EL_SETTY, "-x", "-icanon", "-echo", nullptr);
+  ioctl(STDIN_FILENO, FIONREAD, &typedEarly);
   return editor;
 }
 
@@ -199,18 +188,16 @@ std::optional<std::string> readLine(const std::string& promptText, const Complet
   shownPrompt = *characters;
   completer = &complete;
   lastTab.reset();
-  hasNewWidth();
   const bool ended = el_wgets(editor, nullptr) == nullptr;
   const auto* const edited = el_wline(editor);
   std::wstring line(edited->buffer, edited->lastchar);
   // The end of input may break off a line. One that is whole is an earlier one.
-  if (!std::cout || (ended && (line.empty() || line.back() == L'\n'))) {
+  if (!std::cout.flush() || (ended && (line.empty() || line.back() == L'\n'))) {
     return std::nullopt;
   }
   line.erase(line.find_last_not_of(L'\n') + 1);
   if (!line.empty()) {
-    HistEventW event{};
-    history_w(lineHistory, &event, H_ENTER, line.c_str());
+    history_w(lineHistory, &historyEvent, H_ENTER, line.c_str());
   }
   return toText(line);
 }

@@ -17,23 +17,37 @@ namespace {
 pthread_t reader{};
 termios found{};
 const WakeUp* wakeUp = nullptr;
-std::atomic<int> pending = 0;  ///< The signal that `waitForTerminal` is to return.
+std::atomic<bool> stopped = false;  ///< Since `waitForTerminal` told it last.
+
+/// Sets the terminal, unless it is another process's now.
+void setTerminal(const termios& settings) {
+  const auto foreground = tcgetpgrp(STDIN_FILENO);
+  if (foreground < 0 || foreground == getpgrp()) {
+    tcsetattr(STDIN_FILENO, TCSANOW, &settings);
+  }
+}
 
 void handleSignal(int number) {
   if (pthread_equal(pthread_self(), reader) == 0 && number != SIGABRT) {
     // Nothing but the reader sets the terminal otherwise, and it ends in here.
     pthread_kill(reader, number);
-  } else {
-    if (number != SIGWINCH) {
-      restoreTerminal();
-      std::signal(number, SIG_DFL);
-      raise(number);  // It comes when this returns.
-    }
-    if (number != SIGABRT) {
-      pending = number == SIGWINCH && pending != 0 ? pending.load() : number;
-      wakeUp->signal();
-    }  // Else the reader, awake before the end comes, would set the terminal for editing.
+    return;
   }
+  if (number != SIGWINCH) {
+    termios used = found;
+    tcgetattr(STDIN_FILENO, &used);
+    restoreTerminal();
+    std::signal(number, SIG_DFL);
+    raise(number);
+    sigset_t none;
+    sigemptyset(&none);
+    pthread_sigmask(SIG_SETMASK, &none, nullptr);
+    // The process was stopped, and goes on.
+    std::signal(number, handleSignal);
+    setTerminal(used);
+    stopped = true;
+  }
+  wakeUp->signal();
 }
 
 }  // namespace
@@ -56,20 +70,15 @@ bool watchTerminal() {
 }
 
 void restoreTerminal() {
-  const auto foreground = tcgetpgrp(STDIN_FILENO);
-  if (wakeUp != nullptr && (foreground < 0 || foreground == getpgrp())) {
-    tcsetattr(STDIN_FILENO, TCSANOW, &found);
+  if (wakeUp != nullptr) {
+    setTerminal(found);
   }
 }
 
-int waitForTerminal() {
+bool waitForTerminal(bool& wasStopped) {
   pollfd events[] = {{STDIN_FILENO, POLLIN, 0}, {wakeUp->descriptor(), POLLIN, 0}};
-  int signal = 0;
-  while (signal == 0 && events[0].revents == 0) {
-    poll(events, std::size(events), -1);
-    wakeUp->clear();
-    signal = pending.exchange(0);
-  }
-  std::signal(signal, handleSignal);  // Gone if the process was stopped.
-  return signal;
+  poll(events, std::size(events), -1);
+  wakeUp->clear();
+  wasStopped = stopped.exchange(false);
+  return events[0].revents != 0;
 }

@@ -9,7 +9,7 @@ bool watchTerminal();
 /// Sets the terminal as it was found, unless it is not watched or another process's now.
 void restoreTerminal();
 
-/// Waits until standard input can be read, and returns 0; or until the size of the window has
-/// changed, or the process was stopped and goes on with the terminal as it was found, and returns
-/// the signal that said so: SIGWINCH, or the one that stopped it. On the reading thread.
-int waitForTerminal();
+/// Waits until standard input can be read; or until the size of the window may have changed, or the
+/// process was stopped and goes on. Returns whether standard input can be read, and in `wasStopped`
+/// whether the process was stopped since the last call. On the reading thread.
+bool waitForTerminal(bool& wasStopped);

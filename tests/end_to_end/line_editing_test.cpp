@@ -80,26 +80,28 @@ class Screen {
 
 }  // namespace
 
-// clang-format off
-
 TEST(LineEditing, ShowsWhatIsTyped) {
   const SimulatedDevice device("RADIO_TYPE=1");
   Screen screen(device);
   screen.startTool();
+  // clang-format off
   const std::pair<const char*, std::string> cases[] = {
       {"acd Left Left b '|'", "ab|cd"},
       {"xab Home DC End '|'", "ab|"},
-      {"-- Enter '-- --' Enter z Up Up Up Down '|'", "--\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
+      {"-- Enter '-- --' Enter z Up Up Up Down '|'",
+       "--\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
       {"hä漢字é Left Left '|'", "hä漢|字é"},
       {"xe\u0301か\u3099 Left '|'", "xe\u0301|か\u3099"},
       {"xe\u0301か\u3099\u0301y Left BSpace BSpace '|'", "x|y"},
-      {"\u0301a '|'", "a|"},
+      {"C-Space \u0301a '|'", "a|"},
       {"lo Tab te Tab '|'", "logdump tel |"},
       {"'tel -- cd ' Tab '|'", "tel -- cd logdump/|"},
       {"'logdump  ' Tab '|'", "logdump  |"},
-      {"'logdump ' Tab Tab '|'", "logdump\nbb  cd  core  help  oslog  tel\n" + kPrompt + "logdump |"},
+      {"'logdump ' Tab Tab '|'",
+       "logdump\nbb  cd  core  help  oslog  tel\n" + kPrompt + "logdump |"},
       {"'logdump tel ' Tab Tab '|'", "logdump tel |"},
   };
+  // clang-format on
   for (const auto& [keys, shown] : cases) {
     screen.type(std::string("C-u C-l ") + keys);
     screen.expect(kPrompt + shown);
@@ -137,40 +139,55 @@ TEST(LineEditing, LeavesTheTerminalAsItWas) {
     }
     screen.expect(kPrompt + shown + "\n$ ");
   }
-  screen.startTool();
-  screen.type("qui");
-  screen.expect(kPrompt + "qui");
-  screen.type("C-z");
-  auto shown = kPrompt + "qui\n[1]+  Stopped                 velltool\n$ ";
-  screen.expect(shown);
-  screen.type("fg Enter");
-  screen.expect(shown += "fg\nvelltool\n" + kPrompt + "qui");
-  screen.type("t Enter");
-  screen.expect(shown + "t\n$ ");
+  screen.type("'clear; read -p early; velltool; echo $?' Enter");
+  screen.expect("early");
+  screen.type("Enter C-d");
+  screen.expect("early\n" + kPrompt + "1\n$ ");
 }
 
-TEST(LineEditing, ShowsWhatIsTypedAheadAtTheNextPrompt) {
-  const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent\nTIMESTAMP=T\nTRACE_DUMP_STATE=slow:1000");
+TEST(LineEditing, GoesOnWhereItWasStopped) {
+  const SimulatedDevice device(
+      "RADIO_TYPE=1\nMANAGER=absent\nTIMESTAMP=T\nTRACE_DUMP_STATE=slow:3000");
   auto manager = device.serve("manager");
   Screen screen(device);
   screen.startTool();
-  screen.type("'logdump tel' Enter");
+  auto shown = kPrompt + "qui";
+  const auto stopAndGoOn = [&](const std::string& shownAgain) {
+    screen.type("C-z");
+    screen.expect(shown += "\n[1]+  Stopped                 velltool\n$ ");
+    screen.type("fg Enter");
+    screen.expect(shown += "fg\nvelltool" + shownAgain);
+  };
+  screen.type("qui");
+  screen.expect(shown);
+  stopAndGoOn("\n" + kPrompt + "qui");
+  stopAndGoOn("\n" + kPrompt + "qui");
+  screen.type("C-u 'logdump tel' Enter");
   manager.readUntil("TraceDumpState");
+  shown.replace(shown.rfind("qui"), 3, "logdump tel\n");
+  stopAndGoOn("");
+  // What is typed from here on is not shown before the next prompt.
+  screen.command("run-shell 'until stty -aF #{pane_tty} | grep -q -e \" -echo \"; do :; done'");
   screen.type("'cd logdump' Enter te Tab '|'");
-  screen.expect(kPrompt + "logdump tel\nTelephony log collection: Success\nPath = "
+  screen.expect(shown);
+  screen.expect(shown +
+                "\nTelephony log collection: Success\nPath = "
                 "/private/var/wireless/Library/Logs/Faultkeeper/Baseband/log-bb-T-*\n" +
                 kPrompt + "cd logdump\n(/velltool/logdump)>> tel |");
 }
 
 TEST(LineEditing, GivesWhatLinesFromAPipeGive) {
   const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
-  const std::list<std::string> lines = {"logdump bb", "-- nosuch -- help", "cd logdump", "tel", "cd .. -- cd x", "quit"};
-  std::string input, keys;
+  const std::list<std::string> lines = {"logdump bb", "-- nosuch -- help", "cd logdump",
+                                        "tel",        "cd .. -- cd x",     "quit"};
+  std::string input;
+  std::string keys;
   for (const auto& line : lines) {
     input += line + "\n";
     keys += " '" + line + "' Enter";
   }
-  const auto* const piped = R"(export "$1"; velltool <<< "$2" 2>&1 | expand | sed $'s/\e[^m]*m//g')";
+  const auto* const piped =
+      R"(export "$1"; velltool <<< "$2" 2>&1 | expand | sed $'s/\e[^m]*m//g')";
   auto expected = device.runLine(piped, {kSearchPath, input}).output;
   // A terminal shows each line behind its prompt.
   std::size_t prompt = 0;
