@@ -106,12 +106,18 @@ TEST(LineEditing, ShowsWhatIsTyped) {
     screen.type(std::string("C-u C-l ") + keys);
     screen.expect(kPrompt + shown);
   }
-  const std::string line = "the line is longer than the window, 漢字漢字";
-  screen.type("C-u C-l '" + line + "' Left Left");
-  screen.expect(kPrompt + line);
-  screen.resize(29);
+  // Lines of 17 columns have one to spare, those of 18 are full where the cursor is then.
+  screen.type("C-u C-l '漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字' Left Left");
+  screen.expect(kPrompt + "漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字");
+  screen.resize(17);
   screen.type("'|'");
-  screen.expect("(/velltool)>> the line is lon\nger than the window, 漢字|漢\n字");
+  screen.expect("(/velltool)>> 漢\n漢漢字字字字字字\n字字漢漢漢漢漢漢\n漢|漢字");
+  screen.type("BSpace Left Left Left Left Left Left Left");
+  screen.resize(18);
+  screen.type("'|'");
+  screen.expect("(/velltool)>> 漢漢\n漢字字字字字字字字\n|漢漢漢漢漢漢漢漢\n字");
+  screen.resize(80);
+  screen.expect(kPrompt + "漢漢漢字字字字字字字字|漢漢漢漢漢漢漢漢字");
 }
 
 TEST(LineEditing, LeavesTheTerminalAsItWas) {
