@@ -87,9 +87,9 @@ TEST(LineEditing, ShowsWhatIsTyped) {
   // clang-format off
   const std::pair<const char*, std::string> cases[] = {
       {"acd Left Left b '|'", "ab|cd"},
-      {"xab Home DC End '|'", "ab|"},
-      {"-- Enter '-- --' Enter z Up Up Up Down '|'",
-       "--\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
+      {"xabc Home DC End Left C-d '|'", "ab|"},
+      {"-- Enter Enter '-- --' Enter z Up Up Up Down '|'",
+       "--\n(/velltool)>>\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
       {"hä漢字é Left Left '|'", "hä漢|字é"},
       {"xe\u0301か\u3099 Left '|'", "xe\u0301|か\u3099"},
       {"xe\u0301か\u3099\u0301y Left BSpace BSpace '|'", "x|y"},
@@ -107,17 +107,32 @@ TEST(LineEditing, ShowsWhatIsTyped) {
     screen.expect(kPrompt + shown);
   }
   // Lines of 17 columns have one to spare, those of 18 are full where the cursor is then.
-  screen.type("C-u C-l '漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字' Left Left");
-  screen.expect(kPrompt + "漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字");
+  const std::string above = kPrompt + "--\n";
+  screen.type("C-u C-l -- Enter -- Enter -- Enter -- Enter");
+  screen.type("'漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字' Left Left");
+  screen.expect(above + above + above + above + kPrompt +
+                "漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字");
   screen.resize(17);
   screen.type("'|'");
-  screen.expect("(/velltool)>> 漢\n漢漢字字字字字字\n字字漢漢漢漢漢漢\n漢|漢字");
+  screen.expect(above + "(/velltool)>> 漢\n漢漢字字字字字字\n字字漢漢漢漢漢漢\n漢|漢字");
   screen.type("BSpace Left Left Left Left Left Left Left");
   screen.resize(18);
   screen.type("'|'");
-  screen.expect("(/velltool)>> 漢漢\n漢字字字字字字字字\n|漢漢漢漢漢漢漢漢\n字");
+  screen.expect(above + "(/velltool)>> 漢漢\n漢字字字字字字字字\n|漢漢漢漢漢漢漢漢\n字");
   screen.resize(80);
-  screen.expect(kPrompt + "漢漢漢字字字字字字字字|漢漢漢漢漢漢漢漢字");
+  screen.expect(above + kPrompt + "漢漢漢字字字字字字字字|漢漢漢漢漢漢漢漢字");
+}
+
+TEST(LineEditing, IsLeftOutWhereItCannotBeDone) {
+  const SimulatedDevice device("RADIO_TYPE=1");
+  Screen screen(device);
+  for (const auto* command : {"TERM= velltool", "TERM=dumb velltool", "velltool | cat"}) {
+    screen.startTool(command);
+    screen.type("a Left '|'");
+    screen.expect(kPrompt + "a^[[D|");
+    screen.type("C-c");
+    screen.expect(kPrompt + "a^[[D|^C\n$ ");
+  }
 }
 
 TEST(LineEditing, LeavesTheTerminalAsItWas) {
