@@ -3,7 +3,6 @@
 #include "platform/compression.h"
 #include "platform/helper_client.h"
 #include "platform/manager_client.h"
-#include "platform/manager_names.h"
 #include "platform/program.h"
 #include "platform/telephony.h"
 
@@ -62,7 +61,6 @@ void vell::client::PerformCommand(std::shared_ptr<Manager>, const std::string&,
 }
 
 CommandResult vell::client::PerformCommand(std::shared_ptr<Manager>, const std::string&,
-                                           MessageDict, MessageDict* reply) {
-  reply->set(kKeyTracePropertyValue, device.traceProperty);
+                                           MessageDict, MessageDict*) {
   return {};
 }

@@ -11,7 +11,6 @@ struct Device {
   int productCode = 0;
   int radioVendor = 0;
   std::string programName = "velltool";
-  std::string traceProperty;             ///< The manager's answer to any synchronous command.
   std::vector<std::string> clientCalls;  ///< What was done to the client of the manager.
 };
 

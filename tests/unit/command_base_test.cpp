@@ -1,10 +1,11 @@
 #include "framework/command_base.h"
 
+#include "tests/in_process/log_device.h"
 #include "tests/unit/plain_node.h"
 
 #include <gtest/gtest.h>
 
-TEST(CommandBase, KnowsOnlyTheWholeWordsOfItsHandlersAndChildren) {
+TEST(CommandBase, FindsWholeWordsOnlyAndRunsNoHandlerWithoutAGroup) {
   const auto node = PlainNode::create("root", {}, [](PlainNode& self) {
     self.addCommandHandler(
         "tel", [](auto&&...) { return false; }, "");
@@ -20,4 +21,7 @@ TEST(CommandBase, KnowsOnlyTheWholeWordsOfItsHandlersAndChildren) {
     EXPECT_EQ(node->isValidSubCommand(word), word == "sub") << word;
     EXPECT_EQ(node->getSubCommandObj(word) != nullptr, word == "sub") << word;
   }
+  in_process::logDevice.groupsCanBeMade = false;
+  EXPECT_FALSE(node->execCommand("tel", {}));
+  in_process::logDevice.groupsCanBeMade = true;
 }
