@@ -5,6 +5,7 @@
 #include "platform/portable/work_group_state.h"
 #include "platform/system_log.h"
 
+#include <memory>
 #include <utility>
 
 using in_process::logDevice;
@@ -64,7 +65,7 @@ LogTime currentTime() { return logDevice.now; }
 void logSystemError(const std::string& message) { logDevice.messages.push_back(message); }
 void createEmptyFile(const std::string& path) { logDevice.files[path].clear(); }
 void LogStore::prepare(const Completion& completion) const {
-  completion(logDevice.source, std::nullopt);
+  completion(std::make_shared<LogSource>(), std::nullopt);
 }
 LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/) {}
 LogReader::~LogReader() = default;

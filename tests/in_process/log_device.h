@@ -5,7 +5,6 @@
 #include <chrono>
 #include <list>
 #include <map>
-#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -18,8 +17,6 @@ namespace in_process {
 
 /// What a test sets before it exports, and reads after it has.
 struct LogDevice {
-  std::shared_ptr<const LogSource> source = std::make_shared<LogSource>();  ///< Of the store.
-
   // The reader.
   std::list<LogEntry> entries;                 ///< What it delivers, unfiltered, when activated.
   std::optional<unsigned long> endReason = 5;  ///< Without one it does not end.

@@ -1,4 +1,3 @@
-#include "tests/help_text.h"
 #include "tests/unit/console.h"
 #include "tests/unit/plain_node.h"
 
@@ -22,14 +21,16 @@ TEST(HelpDisplay, ShowsHandlersThenSubCommandsThenBuiltIns) {
   const Console console;
   node->displayHelp();
   EXPECT_EQ(console.output(),
-            helpText("n",
-                     "\t             Zed  -  [text] <|\n\n"
-                     "\t             abc  -  newer\n\n"
-                     "\t            stat  -  ...\n\n"
-                     "\t             tel  -  [text] <|\n\n"
-                     "\t              \xC3\xA4  -  [text] <|\n\n"
-                     "\ta_name_of_more_than_16  -  [x|]]\n\n"
-                     "\t           route  -  [add|del]\n"
-                     "\t                     <cache>  -  [flush]\n"
-                     "\t                                     <page>  -  [drop]\n\n"));
+            "\nOptions for command '\x1b[32mn\x1b[39m':\n\n"
+            "\t             Zed  -  [text] <|\n\n"
+            "\t             abc  -  newer\n\n"
+            "\t            stat  -  ...\n\n"
+            "\t             tel  -  [text] <|\n\n"
+            "\t              \xC3\xA4  -  [text] <|\n\n"
+            "\ta_name_of_more_than_16  -  [x|]]\n\n"
+            "\t           route  -  [add|del]\n"
+            "\t                     <cache>  -  [flush]\n"
+            "\t                                     <page>  -  [drop]\n\n"
+            "\t              cd  -  <sub-command>\n"
+            "\t            help\n\t            back\n\t            quit\n\n");
 }
