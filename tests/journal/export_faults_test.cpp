@@ -118,9 +118,9 @@ TEST(ExportFailures, GiveUpTheOldestOfMoreFilesThanCanBeOpen) {
     all += number + " ";
   }
   EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -Sn 24;")), all + kAll);
-  const auto newest = lastWords(device.run({"-p"}, "ulimit -n 24;"));
-  EXPECT_TRUE((all + kAll + "1 ").ends_with(" " + newest)) << newest;
-  EXPECT_TRUE(newest.ends_with(" 2 1 " + kAll + "1 ")) << newest;
+  // Half of them are for the files.
+  EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -n 24;")),
+            all.substr(all.find("12 ")) + kAll + "1 ");
   // Files that end before the history are not kept open.
   EXPECT_EQ(lastWords(device.run({"-p"}, "H=9000; ulimit -n 24;")), "2 1 9000.000000 ");
 }
@@ -156,12 +156,11 @@ TEST(LiveJournal, IsReadAsFarAsItIsThereAtTheStartAndNotTakenAway) {
     std::string change;
     bool hasAll;         ///< Of the file that is being read.
     std::string behind;  ///< What comes behind that.
-  } cases[] = {{"mv $F x && mv system@2.journal y", true, "next last " + kAll},
+  } cases[] = {{"mv $F x; mv system@2.journal y", true, "next last " + kAll},
                {"rm *.journal", true, "last " + kAll + "1 "},
                {"truncate -s 5M $F", false, "next last " + kAll + "1 "},
                {"truncate -s 0 $F", false, "next last " + kAll + "1 "},
-               {"exec 3<>$F && rm $F && fallocate -p -l 20M /proc/self/fd/3", false,
-                "next last " + kAll + "1 "}};
+               {"rm $F; fallocate -p -l 20M /dev/fd/3", false, "next last " + kAll + "1 "}};
   DeviceJournal device;
   // Few enough of them are selected for the index to be asked, and so many that they are not all
   // read by the time the export is held up.
@@ -181,7 +180,7 @@ TEST(LiveJournal, IsReadAsFarAsItIsThereAtTheStartAndNotTakenAway) {
         // It has written its first lines then, and waits for the test to read on.
         auto exporting = device.startExport(selection);
         exporting.readSome();
-        device.change(inFolder + change);
+        device.change(inFolder + "exec 3<>$F; " + change);
         device.store("user-1.journal", entries(1, "last", 1'000'002));
         const auto words = lastWords(device.finish(exporting));
         ASSERT_TRUE(words.ends_with(behind)) << words.substr(words.size() - 50);

@@ -1,6 +1,7 @@
 // The parts of the log reader that need no journal.
 
 #include "platform/journal/batch_queue.h"
+#include "platform/journal/duplicate_filter.h"
 #include "platform/journal/journal_place.h"
 #include "platform/journal/machine_time_zone.h"
 #include "platform/journal/step_strategy.h"
@@ -44,6 +45,13 @@ TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
   }
 }
 
+TEST(DuplicateFilter, TellsBootsApartAndTakesNothingWithoutACursorForACopy) {
+  DuplicateFilter filter;
+  for (const auto* cursor : {"s=a;i=1;b=a;m=1;t=1;x=1", "s=b;i=1;b=b;m=1;t=1;x=1", "", ""}) {
+    EXPECT_FALSE(filter.isDuplicate(1, cursor)) << cursor;
+  }
+}
+
 TEST(JournalPlace, GoesByTheSequenceOrElseByTheBoot) {
   const auto left = JournalPlace::fromCursor("s=a;i=9;b=a;m=1f").value();
   for (const auto& [cursor, isAfter] : {std::pair("s=a;i=a;b=a;m=1e", true),
@@ -59,12 +67,14 @@ TEST(JournalPlace, GoesByTheSequenceOrElseByTheBoot) {
 TEST(MachineTimeZone, IsWhatTheLibrarySaysAtAnyTime) {
   setenv("TZ", "OLD-1NEW,J60/1:07:09,J300", 1);
   const MachineTimeZone timeZone;
-  // A year from 2021 on, some minutes apart.
-  for (std::time_t time = 1'609'459'200; time < 1'640'995'200; time += 401) {
-    std::tm local{};
-    localtime_r(&time, &local);
-    const auto offset = timeZone.offsetAt(std::chrono::sys_seconds(std::chrono::seconds(time)));
-    ASSERT_EQ(offset.count(), local.tm_gmtoff) << time;
+  // A year from 2021 on, back and forth by some minutes.
+  for (std::time_t next = 1'609'459'200; next < 1'640'995'200; next += 299) {
+    for (const auto time : {next, next - 600}) {
+      std::tm local{};
+      localtime_r(&time, &local);
+      const auto offset = timeZone.offsetAt(std::chrono::sys_seconds(std::chrono::seconds(time)));
+      ASSERT_EQ(offset.count(), local.tm_gmtoff) << time;
+    }
   }
 }
 
