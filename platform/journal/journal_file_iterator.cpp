@@ -22,6 +22,7 @@
 //   - in a live file: the entry that the header names as last is not newer than the one found;
 //   - in any other: the last entry has the time that the header names;
 //   - always: the library still has the file.
+// That a page of any file was lost is seen at the end of the export.
 // If an index fails the check, its file is opened again and walked plainly behind the entry that
 // was reached. Whatever fails, `damaged` says that entries may be missing.
 //
@@ -89,7 +90,7 @@ bool JournalFileIterator::fixEnd() {
       sd_journal_get_realtime_usec(journal.get(), &end.realtime) < 0) {
     return false;
   }
-  end.cursor = cursor();
+  end.cursor = cursorOf(journal.get());
   return !end.cursor.empty();
 }
 
@@ -132,10 +133,6 @@ bool JournalFileIterator::read(EntryBatch& batch) {
     damaged = true;
   }
   return whole;
-}
-
-std::string JournalFileIterator::cursor() {
-  return cursorOf(journal.get());
 }
 
 void JournalFileIterator::advance(bool selected) {

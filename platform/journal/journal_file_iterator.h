@@ -39,7 +39,7 @@ class JournalFileIterator {
   [[nodiscard]] std::uint64_t realtime() const { return current; }
 
   /// The cursor of the current entry, see sd_journal_get_cursor(3); empty when that fails. Slow.
-  std::string cursor();
+  [[nodiscard]] std::string cursor() const { return cursorOf(journal.get()); }
 
   /// Goes to the next entry, and closes at the end. `selected`: whether the current entry was.
   void advance(bool selected);

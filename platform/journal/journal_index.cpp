@@ -9,10 +9,6 @@
 
 namespace {
 
-std::string_view nameOf(JournalField field) {
-  return kJournalFieldNames[indexOf(field)];
-}
-
 struct Finding {
   std::vector<std::string> matches;
   bool hasValues = false;  ///< Whether the index listed any value, wanted or not.
@@ -22,7 +18,7 @@ struct Finding {
 /// list them all.
 bool addWantedValues(sd_journal* journal, JournalField field,
                      const std::function<bool(std::string_view)>& wanted, Finding& finding) {
-  const std::string name(nameOf(field));
+  const std::string name(kJournalFieldNames[indexOf(field)]);
   if (sd_journal_query_unique(journal, name.c_str()) < 0) {
     return false;
   }
