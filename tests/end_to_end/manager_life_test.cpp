@@ -44,7 +44,7 @@ void expectFailure(TestProcess& tool, TestProcess& manager, TestProcess& service
 TEST(ManagerLife, ToolFollowsTheManagerAndTheBus) {
   const SimulatedDevice device(
       "RADIO_TYPE=1\nBUS=no\nTIMESTAMP=T\n"
-      "TRACE_DUMP_STATE.CollectTelephonyLogsWithCoredump=silent\n");
+      "TRACE_DUMP_STATE=silent\nTRACE_DUMP_STATE.CollectTelephonyLogs=answer\n");
   auto tool = device.start({VELLTOOL_PATH});
   EXPECT_EQ(tool.readUntil(kPrompt), kPrompt);
   EXPECT_EQ(answerTo(tool, "logdump tel"), kPrompt);
