@@ -53,12 +53,15 @@ class Client : public testing::Test {
   /// Asks for a collection. The status comes from the queue.
   std::future<std::int32_t> startToAsk() {
     const auto answered = std::make_shared<std::promise<std::int32_t>>();
-    PerformCommand(manager, vell::kCommandTraceDumpState,
-                   [answered](const CommandResult& result, const MessageDict& reply) {
-                     EXPECT_FALSE(reply.isDictionary());
-                     answered->set_value(result.status);
-                   },
-                   {});
+    MessageDict request;
+    request.set(vell::kKeyTraceAction, vell::kCollectTelephonyLogs);
+    PerformCommand(
+        manager, vell::kCommandTraceDumpState,
+        [answered](const CommandResult& result, const MessageDict& reply) {
+          EXPECT_FALSE(reply.isDictionary());
+          answered->set_value(result.status);
+        },
+        request);
     return answered->get_future();
   }
 
