@@ -1,7 +1,5 @@
 #include "tests/journal/device_journal.h"
 
-#include "simulator/journal.h"
-
 #include <gtest/gtest.h>
 
 namespace fs = std::filesystem;
@@ -33,15 +31,11 @@ std::string lastWords(const std::string& text) {
 }
 
 std::string DeviceJournal::inRoot(const std::string& line) const {
-  return "cd \"$VELL_SYSROOT\"; J=" + fs::relative(journals(), root()).string() + "; " + line;
-}
-
-fs::path DeviceJournal::journals() const {
-  return (root() / simulator::kJournalFile).parent_path();
+  return "cd \"$VELL_SYSROOT\"; J=" + kJournals.string() + "; " + line;
 }
 
 void DeviceJournal::store(const std::string& name, const StoredEntries& entries) const {
-  const auto file = journals() / name;
+  const auto file = root() / kJournals / name;
   fs::create_directories(file.parent_path());
   std::string text;
   for (const auto& entry : entries) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/clock.h"
+#include "simulator/journal.h"
 #include "simulator/journal_entry.h"
 #include "tests/end_to_end/simulated_device.h"
 #include "tests/end_to_end/system_log_socket.h"
@@ -15,6 +16,9 @@ using StoredEntries = std::vector<simulator::JournalEntry>;
 
 /// Where the tests count from: 2021-05-04 13:07:21 UTC.
 inline constexpr LogTime kTime{std::chrono::microseconds(1'620'133'641'000'000)};
+
+/// Where the journal files are, below the root.
+inline const auto kJournals = std::filesystem::path(simulator::kJournalFile).parent_path();
 
 /// An entry that is stored some microseconds after kTime. Its last field is its message.
 simulator::JournalEntry message(long after, const std::string& text, Fields fields = {});
@@ -40,9 +44,6 @@ inline const std::string kIncomplete = kStarted + "Invalid oslog stream: reason 
 class DeviceJournal : public SimulatedDevice {
  public:
   DeviceJournal() : SimulatedDevice("BUS=no"), systemLog(root()) {}
-
-  /// Where the journal files are.
-  [[nodiscard]] std::filesystem::path journals() const;
 
   /// Adds `entries` to the journal file `name`. Rotates it behind an entry of very many fields.
   void store(const std::string& name, const StoredEntries& entries) const;

@@ -12,7 +12,7 @@
 namespace {
 
 namespace fs = std::filesystem;
-using namespace std::string_literals;
+using namespace std::literals;
 
 constexpr std::size_t kStored = 20000;
 
@@ -61,10 +61,9 @@ TEST(ExportFailures, TellWhatTheJournalOrTheFileIsNotFitFor) {
     device.store("system.journal", {message(0, text)});
     const auto start = currentTime();
     const auto told = device.run({"-p"}, change + "; umask 0; " + bound);
-    const auto taken = currentTime() - start;
+    EXPECT_TRUE(!change.ends_with("3<>out.txt") || (currentTime() - start) / 10s == 1);
     const auto mode = device.change("chmod -f 700 $J; [ ! -f out.txt ] || stat -Lc %a out.txt");
     EXPECT_EQ(told + mode, expected) << change;
-    EXPECT_TRUE(!change.ends_with("3<>out.txt") || taken / std::chrono::seconds(10) == 1);
   }
 }
 
@@ -75,7 +74,7 @@ TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
   for (const std::string name : {"system.journal", "system@1.journal"}) {
     DeviceJournal device;
     device.store(name, entries(kStored, "tenth", 0, 10));
-    const auto file = device.journals() / name;
+    const auto file = device.root() / kJournals / name;
     const auto stored = contentOf(file);
     const auto whole = device.run();
     const auto runDamaged = [&](std::size_t place, const std::string& bytes) {
@@ -92,17 +91,16 @@ TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
     }
     // The tables of its fields and of their values, and places in what comes behind them. Without
     // the index, a selection may well find what a walk through the file does not come to.
-    std::vector<std::pair<std::size_t, std::size_t>> places = {{280, 5000}, {5624, 3'700'000}};
-    for (std::size_t place = 3'750'000; place < 6'000'000; place += 125'000) {
-      places.emplace_back(place, 1024);
-    }
+    const std::pair<std::size_t, std::size_t> places[] = {{280, 5000},       {5624, 3'700'000},
+                                                          {3'750'000, 1024}, {4'250'000, 1024},
+                                                          {4'750'000, 1024}, {5'250'000, 1024}};
     for (const auto& [place, length] : places) {
       const auto found = linesOf(runDamaged(place, std::string(length, '\0')));
       EXPECT_GE(linesOf(device.run({"-p", "tenth"})).size(), found.size()) << name << place;
     }
     // How many entries have a value: it is raised last, and a crash comes before.
     runDamaged(stored.find("_EXE=/usr/bin/tenth") - 16, std::string("\1\0\0", 3));
-    fs::rename(file, device.journals() / "system@1.journal~");
+    fs::rename(file, file.parent_path() / "system@1.journal~");
     EXPECT_EQ(device.run({"-p", "tenth"}), whole);
   }
 }
