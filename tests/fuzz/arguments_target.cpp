@@ -17,8 +17,6 @@
 
 namespace {
 
-using Words = std::vector<std::string>;
-
 std::string lowered(std::string word) {
   std::transform(word.begin(), word.end(), word.begin(),
                  [](unsigned char c) { return std::tolower(c); });
@@ -43,7 +41,7 @@ void checkTraceValue(const std::string& text) {
   }
 }
 
-void checkCollection(const Words& words) {
+void checkCollection(const std::vector<std::string>& words) {
   static const std::map<std::string, CompressionMode> modes = {
       {"nocompress", 0}, {"tar.gz", 1}, {"tar", 2}, {"nonui", 3}};
   CompressionMode counted[] = {0, 0};
@@ -57,7 +55,7 @@ void checkCollection(const Words& words) {
   require(options.mode == counted[0] && options.nonui == (counted[1] == 3), "another mode or flag");
 }
 
-void checkExport(const Words& words) {
+void checkExport(const std::vector<std::string>& words) {
   auto& device = in_process::logDevice = {};
   const Console console;
   const bool exported = makeOsLogHandler()({}, {words.begin(), words.end()});

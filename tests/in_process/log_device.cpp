@@ -12,8 +12,7 @@ using in_process::logDevice;
 
 namespace {
 
-class DeviceFile : public WritableFile {
- public:
+struct DeviceFile : WritableFile {
   explicit DeviceFile(std::string filePath) : path(std::move(filePath)) {}
 
   std::error_code append(std::string_view bytes) override {
@@ -24,7 +23,6 @@ class DeviceFile : public WritableFile {
     return {};
   }
 
- private:
   std::string path;
 };
 
