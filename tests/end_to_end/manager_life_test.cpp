@@ -53,14 +53,15 @@ TEST(ManagerLife, ToolFollowsTheManagerAndTheBus) {
     auto manager = device.serve("manager");
     EXPECT_EQ(manager.readLine(), "OpenClient \"velltool\"");
     expectInTime(tool, kCollected);
-    manager.write("event Unrelated Stopped\nstate Stopping\n");
+    manager.write("state Stopping\n");
     manager.readUntil("Event ServerStateChange");
     expectInTime(tool, "");
-    manager.write("state Started\n");
-    manager.readUntil("Event ServerStateChange");
+    manager.write("state Started\nevent Unrelated Stopped\n");
+    manager.readUntil("Event Unrelated");
     expectInTime(tool, kCollected);
     expectFailure(tool, manager, manager);
     auto successor = device.serve("manager");
+    EXPECT_EQ(successor.readLine(), "OpenClient \"velltool\"");
     expectInTime(tool, kCollected);
     if (life == 0) {
       // The bus ends a connection that sends it more than 32 MiB at once.
