@@ -115,7 +115,7 @@ TEST(ExportFailures, GiveUpTheOldestOfMoreFilesThanCanBeOpen) {
                  {{now - std::chrono::hours(age), {{"MESSAGE", number}}}});
     all += number + " ";
   }
-  EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -Sn 24;")), all + kAll);
+  EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -Sn 16;")), all + kAll);
   // Half of them are for the files.
   EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -n 24;")),
             all.substr(all.find("12 ")) + kAll + "1 ");
