@@ -18,7 +18,7 @@ namespace {
 
 TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
   // How large each batch is, and how many have room.
-  for (const auto& [bytes, most] : {std::pair(0, 24), {1 << 20, 6}, {7 << 20, 1}}) {
+  for (const auto& [bytes, most] : {std::pair(0U, 24), {1U << 20, 6}, {7U << 20, 1}}) {
     BatchQueue queue;
     std::counting_semaphore<> queued(0);
     std::thread pushing([&queue, &queued, text = std::string(bytes, 'x')] {
