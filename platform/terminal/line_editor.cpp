@@ -47,11 +47,12 @@ ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   return static_cast<ssize_t>(count);
 }
 
-/// Looks how wide the screen is; whether that has changed.
+/// Looks how wide the screen is; whether that has changed. One of unknown width counts as libedit
+/// takes it.
 bool hasNewWidth() {
   winsize window{};
   ioctl(STDOUT_FILENO, TIOCGWINSZ, &window);
-  return std::exchange(columns, std::max<int>(window.ws_col, 1)) != columns;
+  return std::exchange(columns, window.ws_col < 2 ? 80 : window.ws_col) != columns;
 }
 
 /// Takes the prompt and the line off the screen: a terminal wraps them anew when its width changes.
@@ -88,8 +89,7 @@ ssize_t readByte(EditLine* editor, char& byte) {
     } else if (isReadable) {
       const auto count = read(STDIN_FILENO, &byte, 1);
       // Ctrl-D that was typed early has become null, which is else what Ctrl-Space types.
-      byte = byte == '\0' && typedEarly > 0 ? CEOF : byte;
-      typedEarly = std::max(typedEarly - 1, 0);
+      byte = typedEarly > 0 && typedEarly-- > 0 && byte == '\0' ? CEOF : byte;
       return count;
     }
   }
@@ -167,6 +167,10 @@ EditLine* makeEditor() {
   el_wset(
       editor, EL_PROMPT, +[](EditLine*) { return shownPrompt.data(); });
   el_wset(editor, EL_GETCFN, readCharacter);
+  // libedit loses what a terminal that inserts and deletes characters moves across a row's end.
+  for (const auto* capability : {"ic", "IC", "im", "dc", "DC", "dm"}) {
+    el_set(editor, EL_SETTC, capability, "", nullptr);
+  }
   el_set(editor, EL_EDITOR, "emacs");
   el_set(editor, EL_ADDFN, "complete", "", completeWord);
   el_set(editor, EL_BIND, "^I", "complete", nullptr);

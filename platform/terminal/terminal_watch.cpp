@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <atomic>
+#include <cerrno>
 #include <csignal>
 #include <cstdlib>
 #include <iterator>
@@ -33,6 +34,7 @@ void handleSignal(int number) {
     pthread_kill(reader, number);
     return;
   }
+  const int error = errno;
   if (number != SIGWINCH) {
     termios used = found;
     tcgetattr(STDIN_FILENO, &used);
@@ -48,6 +50,7 @@ void handleSignal(int number) {
     stopped = true;
   }
   wakeUp->signal();
+  errno = error;  // The signal may have come before somebody looked at it.
 }
 
 }  // namespace

@@ -94,6 +94,8 @@ TEST(LineEditing, ShowsWhatIsTyped) {
       {"xe\u0301か\u3099 Left '|'", "xe\u0301|か\u3099"},
       {"xe\u0301か\u3099\u0301y Left BSpace BSpace '|'", "x|y"},
       {"C-Space \u0301a '|'", "a|"},
+      {"'what is longer than a row of the screen, where one letter is put in front' Home b",
+       "bwhat is longer than a row of the screen, where one letter is put\nin front"},
       {"lo Tab te Tab '|'", "logdump tel |"},
       {"'tel -- cd ' Tab '|'", "tel -- cd logdump/|"},
       {"'logdump  ' Tab '|'", "logdump  |"},
