@@ -89,7 +89,7 @@ ssize_t readByte(EditLine* editor, char& byte) {
     } else if (isReadable) {
       const auto count = read(STDIN_FILENO, &byte, 1);
       // Ctrl-D that was typed early has become null, which is else what Ctrl-Space types.
-      byte = typedEarly > 0 && typedEarly-- > 0 && byte == '\0' ? CEOF : byte;
+      byte = typedEarly > 0 && typedEarly-- > 0 && byte == '\0' ? char{CEOF} : byte;
       return count;
     }
   }
