@@ -30,7 +30,8 @@ void setTerminal(const termios& settings) {
 
 void handleSignal(int number) {
   if (pthread_equal(pthread_self(), reader) == 0 && number != SIGABRT) {
-    // Nothing but the reader sets the terminal otherwise, and it ends in here.
+    // Nothing but the reader sets the terminal otherwise, and it ends in here. abort(3) would not
+    // wait for that.
     pthread_kill(reader, number);
     return;
   }
