@@ -4,17 +4,6 @@
 
 #include <gtest/gtest.h>
 
-TEST(StartUp, ReadsCommandsFromATerminalThatIsDumb) {
-  const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
-  auto tool = device.start(
-      {"TERM=dumb", "script", "-qec", std::string("'") + VELLTOOL_PATH + "'", "/dev/null"});
-  // The prompt is there before anything is typed; the terminal shows what is typed.
-  EXPECT_EQ(tool.readUntil(">> "), kPrompt);
-  tool.write("logdump bb\n");
-  EXPECT_EQ(tool.readUntil(">> "), "logdump bb\r\nBaseband log collection: Failed\r\n" + kPrompt);
-  EXPECT_EQ(tool.finish().status, 1);
-}
-
 TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
 #ifdef VELL_SANITIZED
   GTEST_SKIP() << "A sanitizer needs an address space without limits.";
