@@ -4,11 +4,8 @@
 
 #include <gtest/gtest.h>
 
-TEST(TracePaths, GoByTheVendorOfTheRadioWhichIsAskedForOnceForCoreDumps) {
-  for (const int vendor : {0, 1, 2, 3, -2}) {
-    in_process::device.radioVendor = vendor;
+TEST(TracePaths, AskForTheVendorOfTheRadioOnceForCoreDumps) {
+  for (int& vendor = in_process::device.radioVendor; vendor <= 2; ++vendor) {
     EXPECT_EQ(vell::trace::getCoreDumpDirSuffix(), "-cd");
-    EXPECT_EQ(vell::trace::getBasebandTraceDirSuffix(false), vendor == 2 ? "-bb-trace" : "-diag");
-    EXPECT_EQ(vell::trace::getBasebandTraceDirSuffix(true), vendor == 2 ? "-bb-trace" : "-qdss");
   }
 }
