@@ -4,27 +4,22 @@
 #include "platform/journal/journal_files.h"
 
 #include <algorithm>
-#include <limits>
+#include <utility>
 
 JournalReader::JournalReader(const std::optional<LogFilter>& filter, LogTime from)
     : selection(filter), start(from) {
   // A time of 0 stands for none.
   const auto earliest =
       static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 1));
-  auto files = findJournalFiles(earliest);
-  complete = !files.damaged;
-  for (auto& found : files.found) {
-    sources.push_back({JournalFileIterator(std::move(found), earliest)});
-    auto& iterator = sources.back().iterator;
+  auto found = findJournalFiles(earliest);
+  complete = !found.damaged;
+  for (auto& journalFile : found.found) {
+    auto& file = files.emplace_back(std::move(journalFile), earliest);
     // The end of a live file is fixed now. Any other file is opened when its turn comes.
-    if (iterator.journalFile().isLive) {
-      iterator.start(selection);
+    if (file.journalFile().isLive) {
+      file.start(selection);
     }
-  }
-  for (auto& file : sources) {
-    file.openPredecessors = static_cast<std::size_t>(
-        std::count_if(sources.begin(), sources.end(),
-                      [&](const Source& other) { return precedes(other, file); }));
+    turns.add(file.journalFile().first, file.journalFile().last, file.reached());
   }
 }
 
@@ -42,7 +37,7 @@ bool JournalReader::read(EntryBatch& batch) {
 /// Appends the current entry to `batch` if it can be read, is selected and no duplicate. Returns
 /// whether it is selected.
 bool JournalReader::readEntry(EntryBatch& batch) {
-  if (!current->iterator.read(batch)) {
+  if (!current->read(batch)) {
     return false;
   }
   const bool selected = isSelected(batch);
@@ -62,57 +57,33 @@ bool JournalReader::isSelected(const EntryBatch& batch) const {
 
 /// Whether the current entry was read before, from another file.
 bool JournalReader::isDuplicate() {
-  auto& iterator = current->iterator;
-  return iterator.journalFile().overlap.holds(iterator.realtime()) &&
-         duplicates.isDuplicate(iterator.realtime(), iterator.cursor());
+  return current->journalFile().overlap.holds(current->realtime()) &&
+         duplicates.isDuplicate(current->realtime(), current->cursor());
 }
 
 /// Steps to the current file's next entry. Ends the file's turn if another file has an older one.
 void JournalReader::advance(bool selected) {
-  current->iterator.advance(selected);
-  if (current->iterator.isClosed() || turnOf(*current) > nextTurn) {
+  current->advance(selected);
+  if (current->isClosed() || !turns.reach(current->reached())) {
     current = nullptr;
   }
 }
 
 /// Gives the turn to the file whose next entry is the oldest. False when no file has one.
 bool JournalReader::takeTurn() {
-  while (current == nullptr && !sources.empty()) {
-    const auto first = std::min_element(
-        sources.begin(), sources.end(),
-        [](const Source& left, const Source& right) { return turnOf(left) < turnOf(right); });
-    if (first->iterator.isClosed()) {
-      end(first);
-    } else if (first->iterator.isWaiting()) {
+  while (const auto next = turns.next()) {
+    auto& file = files[*next];
+    if (file.isClosed()) {
+      complete = complete && !file.isDamaged();
+      turns.end();
+    } else if (file.isWaiting()) {
       // Its first entry may turn out to be newer than it was taken for.
-      first->iterator.start(selection);
+      file.start(selection);
+      turns.reach(file.reached());
     } else {
-      current = &*first;
+      current = &file;
+      return true;
     }
   }
-  nextTurn = {true, std::numeric_limits<std::uint64_t>::max()};
-  for (const auto& source : sources) {
-    nextTurn = &source == current ? nextTurn : std::min(nextTurn, turnOf(source));
-  }
-  return current != nullptr;
-}
-
-/// Lets the files go on that had to wait for the closed `file`.
-void JournalReader::end(std::vector<Source>::iterator file) {
-  complete = complete && !file->iterator.isDamaged();
-  for (auto& other : sources) {
-    other.openPredecessors -= precedes(*file, other) ? 1 : 0;
-  }
-  sources.erase(file);
-}
-
-JournalReader::Turn JournalReader::turnOf(const Source& file) {
-  return {file.openPredecessors > 0, file.iterator.reached()};
-}
-
-/// Whether all of `left` was stored before `right`.
-bool JournalReader::precedes(const Source& left, const Source& right) {
-  const auto& last = left.iterator.journalFile().last;
-  const auto& first = right.iterator.journalFile().first;
-  return &left != &right && last && first && isStoredBefore(*last, *first);
+  return false;
 }

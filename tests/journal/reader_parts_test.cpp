@@ -5,14 +5,18 @@
 #include "platform/journal/journal_place.h"
 #include "platform/journal/machine_time_zone.h"
 #include "platform/journal/step_strategy.h"
+#include "platform/journal/turns.h"
 
 #include <gtest/gtest.h>
 
 #include <cstdlib>
 #include <ctime>
+#include <optional>
 #include <semaphore>
 #include <string>
 #include <thread>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -23,18 +27,16 @@ TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
     std::counting_semaphore<> queued(0);
     std::thread pushing([&queue, &queued, text = std::string(bytes, 'x')] {
       EntryBatch batch;
-      const auto push = [&] {
+      do {
+        queued.release();
         batch.begin(0);
         batch.add(JournalField::Message, text);
-        return queue.push(batch);
-      };
-      while (push()) {
-        queued.release();
-      }
+      } while (queue.push(batch));
     });
     EntryBatch batch;
     EXPECT_TRUE(queue.pop(batch));
-    for (int count = 0; count <= most; ++count) {
+    // One took the place of the one that is out, and one waits.
+    for (int count = 0; count < most + 2; ++count) {
       queued.acquire();
     }
     queue.close();
@@ -61,6 +63,37 @@ TEST(JournalPlace, GoesByTheSequenceOrElseByTheBoot) {
     EXPECT_EQ(isStoredBefore(left, JournalPlace::fromCursor(cursor).value()), isAfter) << cursor;
   }
   EXPECT_FALSE(JournalPlace::fromCursor("s=a;i=;b=a;m=1") || JournalPlace::fromCursor(""));
+}
+
+TEST(Turns, FollowTheOrderOfBeingStored) {
+  struct File {
+    std::vector<std::uint64_t> times;
+    std::optional<JournalPlace> first = {}, last = {};
+  };
+  const auto at = [](std::uint64_t number) { return JournalPlace{"a", number, "a", 1}; };
+  const std::pair<std::vector<File>, std::string> cases[] = {
+      {{{{1, 3, 4}}, {{2, 3, 4}}, {{2, 5}}}, "01201102"},
+      {{{{1, 2}, at(7)}, {{8, 9}, at(1), at(3)}, {{5, 8, 30}}}, "2211002"},
+      {{{{9}, at(1), at(1)}, {{6}, at(5), at(5)}, {{3}, at(9), at(9)}}, "012"},
+      {{{{4, 7}, at(6), at(1)}, {{5}, at(6), at(1)}, {{9}}}, "2010"}};
+  for (auto [files, expected] : cases) {
+    Turns turns;
+    for (const auto& file : files) {
+      turns.add(file.first, file.last, file.times.front());
+    }
+    std::string taken;
+    while (const auto next = turns.next()) {
+      auto& times = files[*next].times;
+      do {
+        taken += std::to_string(*next);
+        times.erase(times.begin());
+      } while (!times.empty() && turns.reach(times.front()));
+      if (times.empty()) {
+        turns.end();
+      }
+    }
+    EXPECT_EQ(taken, expected);
+  }
 }
 
 TEST(MachineTimeZone, IsWhatTheLibrarySaysAtAnyTime) {
