@@ -9,6 +9,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cstdlib>
 #include <ctime>
 #include <optional>
@@ -24,24 +25,24 @@ TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
   // How large each batch is, and how many have room.
   for (const auto& [bytes, most] : {std::pair(0U, 24), {1U << 20, 6}, {7U << 20, 1}}) {
     BatchQueue queue;
-    std::counting_semaphore<> queued(0);
-    std::thread pushing([&queue, &queued, text = std::string(bytes, 'x')] {
+    std::counting_semaphore<> pushes(0);
+    std::thread pushing([&queue, &pushes, text = std::string(bytes, 'x')] {
       EntryBatch batch;
       do {
-        queued.release();
         batch.begin(0);
         batch.add(JournalField::Message, text);
+        pushes.release();
       } while (queue.push(batch));
     });
     EntryBatch batch;
     EXPECT_TRUE(queue.pop(batch));
-    // One took the place of the one that is out, and one waits.
+    // One takes the place of that, and one waits.
     for (int count = 0; count < most + 2; ++count) {
-      queued.acquire();
+      pushes.acquire();
     }
+    EXPECT_FALSE(pushes.try_acquire_for(std::chrono::milliseconds(20)));
     queue.close();
     pushing.join();
-    EXPECT_FALSE(queued.try_acquire());
     EXPECT_FALSE(queue.pop(batch));
   }
 }
