@@ -30,8 +30,7 @@ void setTerminal(const termios& settings) {
 
 void handleSignal(int number) {
   if (pthread_equal(pthread_self(), reader) == 0 && number != SIGABRT) {
-    // Nothing but the reader sets the terminal otherwise, and it ends in here. abort(3) would not
-    // wait for that.
+    // The reader alone sets the terminal. abort(3) does not wait for it.
     pthread_kill(reader, number);
     return;
   }
