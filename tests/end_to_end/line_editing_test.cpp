@@ -50,7 +50,7 @@ class Screen {
 
   /// Waits until the shell's words `condition` succeed; "#{pane_tty}" is the terminal.
   void waitUntil(const std::string& condition) {
-    command("run-shell 'until " + condition + "; do :; done'");
+    command("run-shell 'for look in $(seq 9999); do " + condition + " && break; done'");
   }
 
   /// Waits until `rows` are on the screen: up to the last that is not blank.
@@ -113,7 +113,7 @@ TEST(LineEditing, ShowsWhatIsTyped) {
     screen.type(std::string("C-u C-l ") + keys);
     screen.expect(kPrompt + shown);
   }
-  // Rows of 17 columns have one to spare beside wide characters.
+  // In rows of 17 columns, wide characters leave one free.
   const std::string above = kPrompt + "--\n";
   screen.type("C-u C-l -- Enter -- Enter -- Enter -- Enter");
   screen.type("'漢漢漢字字字字字字字字漢漢漢漢漢漢漢漢字' Left Left");
@@ -139,10 +139,12 @@ TEST(LineEditing, IsLeftOutWhereItCannotBeDone) {
   Screen screen(device);
   for (const auto* command : {"TERM= velltool", "TERM=dumb velltool", "velltool | cat"}) {
     screen.startTool(command);
+    screen.type("' --' Enter");
+    screen.expect(kPrompt + " --\n" + kPrompt);
     screen.type("a Left '|'");
-    screen.expect(kPrompt + "a^[[D|");
+    screen.expect(kPrompt + " --\n" + kPrompt + "a^[[D|");
     screen.type("C-c");
-    screen.expect(kPrompt + "a^[[D|^C\n$ ");
+    screen.expect(kPrompt + " --\n" + kPrompt + "a^[[D|^C\n$ ");
   }
 }
 
