@@ -27,6 +27,5 @@ TEST(Utf8, ReplacesForInterchangeWhatNotEveryProgramTakes) {
 
 TEST(Text, ComparesWithoutTheCaseOfAsciiLettersAlone) {
   EXPECT_TRUE(equalNoCase("Az.\xC3\x84", "aZ.\xC3\x84"));
-  EXPECT_FALSE(equalNoCase("[", "{"));
-  EXPECT_FALSE(equalNoCase("\xC3\x84", "\xC3\xA4"));
+  EXPECT_FALSE(equalNoCase("[", "{") || equalNoCase("\xC3\x84", "\xC3\xA4"));
 }

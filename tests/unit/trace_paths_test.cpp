@@ -5,7 +5,7 @@
 #include <gtest/gtest.h>
 
 TEST(TracePaths, AskForTheVendorOfTheRadioOnceForCoreDumps) {
-  for (int& vendor = in_process::device.radioVendor; vendor <= 2; ++vendor) {
+  for (int& vendor = in_process::device.radioVendor = 0; vendor <= 2; ++vendor) {
     EXPECT_EQ(vell::trace::getCoreDumpDirSuffix(), "-cd");
   }
 }
