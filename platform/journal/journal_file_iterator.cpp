@@ -204,6 +204,8 @@ void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
 void JournalFileIterator::close(bool complete) {
   damaged = damaged || !complete || !hasJournalFile(journal.get());
   state = State::Closed;
+  index = JournalIndex();
+  end = End();
   journal.reset();
   file.file = FileDescriptor();
 }

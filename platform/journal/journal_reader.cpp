@@ -64,7 +64,7 @@ bool JournalReader::isDuplicate() {
 /// Steps to the current file's next entry. Ends the file's turn if another file has an older one.
 void JournalReader::advance(bool selected) {
   current->advance(selected);
-  if (current->isClosed() || !turns.reach(current->reached())) {
+  if (!turns.reach(current->reached()) || current->isClosed()) {
     current = nullptr;
   }
 }

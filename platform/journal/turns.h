@@ -13,29 +13,31 @@
 /// Files that wait for each other, as damaged or forged ones may do, come last. On one thread.
 class Turns {
  public:
-  /// Adds a file, before any turn; its number is that of the files added before it. `first`,
-  /// `last`: the places of its first and last entry, if known. `reached`: see `reach`.
+  /// Adds a file. Files are numbered from 0 in this order. Call before the first `next`. `first`,
+  /// `last`: the places of its first and last entry, if known. `reached`: the latest time that it
+  /// has come to, in microseconds; a lower bound for a file that is not started.
   void add(std::optional<JournalPlace> first, std::optional<JournalPlace> last,
            std::uint64_t reached);
 
-  /// Gives the turn to a file and returns its number; nullopt when all have ended. Of several files
-  /// that have come to one time, to the one added first.
+  /// Gives the turn to the file that is due, also in the middle of a turn. Returns its number;
+  /// nullopt when all have ended. Of files that are due alike it takes the one added first.
   std::optional<std::size_t> next();
 
-  /// Tells the latest time, in microseconds, that the file whose turn it is has come to. Returns
-  /// whether it goes on: no other file has an older entry.
+  /// Sets the latest time, in microseconds, that the file whose turn it is has come to. Returns
+  /// whether it goes on: no other file is due before it. Call only while a file has its turn.
   bool reach(std::uint64_t time);
 
-  /// Ends the file whose turn it is, and lets the files go on that had to wait for it.
+  /// Ends the file whose turn it is, and lets the files go on that had to wait for it. Then none
+  /// has its turn.
   void end();
 
  private:
-  /// A file that has entries left, and how many such files were stored before it.
+  /// A file that has not ended, and how many such files were stored before it.
   struct File {
-    std::size_t number;
+    std::size_t number = 0;
     std::optional<JournalPlace> first;
     std::optional<JournalPlace> last;
-    std::uint64_t reached;
+    std::uint64_t reached = 0;
     std::size_t openPredecessors = 0;
   };
 
@@ -47,5 +49,5 @@ class Turns {
 
   std::vector<File> files;
   std::size_t current = 0;  ///< Index of the file whose turn it is.
-  Rank following;           ///< The lowest of the other files.
+  Rank following;           ///< The lowest of the other files, as of the last `next`.
 };

@@ -45,6 +45,7 @@ TEST(ExportFailures, TellWhatTheJournalOrTheFileIsNotFitFor) {
       {"ln -s /dev/null out.txt", kStarted},
       {"ln -s /dev/full out.txt", notWritten + "No space left on device\nstatus 1\n"},
       {"mkdir out.txt", notCreated},
+      {"ln -s none/x out.txt", notCreated},
       {"mkfifo out.txt", notCreated},
       {"mkfifo out.txt; head -c 1 out.txt >first & exec 3>out.txt",
        notWritten + "Broken pipe\nstatus 1\n"},

@@ -36,7 +36,7 @@ TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
     });
     EntryBatch batch;
     EXPECT_TRUE(queue.pop(batch));
-    // One takes the place of that, and one waits.
+    // One more has room then, and the next one waits.
     for (int count = 0; count < most + 2; ++count) {
       pushes.acquire();
     }
@@ -73,6 +73,7 @@ TEST(Turns, FollowTheOrderOfBeingStored) {
   };
   const auto at = [](std::uint64_t number) { return JournalPlace{"a", number, "a", 1}; };
   const std::pair<std::vector<File>, std::string> cases[] = {
+      // By time; behind those that were stored before; last what waits for each other.
       {{{{1, 3, 4}}, {{2, 3, 4}}, {{2, 5}}}, "01201102"},
       {{{{1, 2}, at(7)}, {{8, 9}, at(1), at(3)}, {{5, 8, 30}}}, "2211002"},
       {{{{9}, at(1), at(1)}, {{6}, at(5), at(5)}, {{3}, at(9), at(9)}}, "012"},
