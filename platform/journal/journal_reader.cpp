@@ -64,6 +64,7 @@ bool JournalReader::isDuplicate() {
 /// Steps to the current file's next entry. Ends the file's turn if another file has an older one.
 void JournalReader::advance(bool selected) {
   current->advance(selected);
+  // A file that closes here is ranked by how far it came, too: others may have to wait for it.
   if (!turns.reach(current->reached()) || current->isClosed()) {
     current = nullptr;
   }

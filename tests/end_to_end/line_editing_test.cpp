@@ -48,7 +48,8 @@ class Screen {
     waitUntil("stty -F #{pane_tty} size | grep -q \" " + columns + "$\"");
   }
 
-  /// Waits until the shell's words `condition` succeed; "#{pane_tty}" is the terminal.
+  /// Waits until the shell's words `condition` succeed, for some ten thousand looks at most;
+  /// "#{pane_tty}" is the terminal.
   void waitUntil(const std::string& condition) {
     command("run-shell 'for look in $(seq 9999); do " + condition + " && break; done'");
   }
