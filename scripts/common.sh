@@ -5,7 +5,7 @@ cd "$(dirname "${BASH_SOURCE[0]}")/.."
 
 build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev libedit-dev)
 run_packages=(dbus-daemon systemd-journal-remote)
-check_packages=(libgtest-dev clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev mandoc
+check_packages=(libgtest-dev clang-14 clang-format-14 clang-tidy-14 git libclang-rt-14-dev mandoc
   python3-dbusmock tmux zsh)
 
 say() {
