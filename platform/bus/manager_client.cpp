@@ -51,7 +51,8 @@ MessageDict::Value readState(BusOutcome outcome, sd_bus_message* reply) {
     return kServerStateStopped;
   }
   MessageDict::Value state = MessageDict::OtherType{};
-  if (outcome == BusOutcome::answered && !readValue(reply, state)) {
+  if (outcome == BusOutcome::answered &&
+      (sd_bus_message_has_signature(reply, "v") <= 0 || !readValue(reply, state))) {
     state = MessageDict::OtherType{};
   }
   return state;

@@ -81,11 +81,11 @@ class Client : public testing::Test {
 /// Somebody on the bus, who sends signals to the client and may own the manager's name.
 class Peer {
  public:
-  Peer() {
+  explicit Peer(const char* signatureOfState = "v") : stateSignature(signatureOfState) {
     sd_bus* opened = nullptr;
     sd_bus_open_system(&opened);
     bus.reset(opened);
-    sd_bus_add_filter(opened, nullptr, answer, &lastAnswered);
+    sd_bus_add_filter(opened, nullptr, answer, this);
     // The bus gives out its names in the order in which they are asked for.
     const char* name = nullptr;
     EXPECT_GE(sd_bus_get_unique_name(opened, &name), 0);
@@ -132,17 +132,19 @@ class Peer {
   }
 
   static int answer(sd_bus_message* call, void* userdata, sd_bus_error* /*error*/) {
+    auto& peer = *static_cast<Peer*>(userdata);
     if (sd_bus_message_is_method_call(call, nullptr, "Get") > 0) {
-      sd_bus_reply_method_return(call, "v", "s", "Started");
+      sd_bus_reply_method_return(call, peer.stateSignature, "s", "Started", "second");
     } else if (sd_bus_message_is_method_call(call, nullptr, "PerformCommand") > 0) {
       sd_bus_reply_method_errorf(call, SD_BUS_ERROR_SERVICE_UNKNOWN, "the manager's own words");
     } else {
       return 0;
     }
-    *static_cast<std::string*>(userdata) = sd_bus_message_get_member(call);
+    peer.lastAnswered = sd_bus_message_get_member(call);
     return 1;
   }
 
+  const char* const stateSignature;  ///< Of its reply to a read of the state, "v" and perhaps "s".
   BusPtr bus;
   std::string lastAnswered;
 };
@@ -213,9 +215,16 @@ TEST_F(Client, BelievesOnlyTheBusAndTheOwnerOfTheManagersName) {
   bus.reset();
   bus = device->serve("bus");
   EXPECT_EQ(ask(), vell::kStatusManagerNotRunning);
-  const Peer namesake;  // The new bus counts its connections anew.
+  const Peer namesake("vs");  // The new bus counts its connections anew.
   namesake.sendEvent("Started");
   onQueue([&] { EXPECT_EQ(states.back(), "Stopped"); });
+  // A second value behind the state makes it no state.
+  namesake.takeName();
+  namesake.answerUpTo("Get");
+  answer = startToAsk();
+  namesake.answerUpTo("PerformCommand");
+  answer.get();
+  onQueue([&] { EXPECT_EQ(states.back(), ""); });
 }
 
 TEST_F(Client, FailsOutstandingRequestsWhenReleased) {
