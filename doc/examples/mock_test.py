@@ -9,6 +9,7 @@ import dbus
 import dbusmock
 
 TEMPLATE = os.path.join(os.path.dirname(os.path.abspath(__file__)), "vell_manager.py")
+NOTHING = dbus.Dictionary(signature="sv")
 
 
 def velltool(*words):
@@ -30,8 +31,15 @@ class VelltoolTest(dbusmock.DBusTestCase):
                          ("TraceDumpState", "[velltool] why"))
 
     def test_says_that_a_collection_has_failed(self):
-        self.mock.Answer("TraceDumpState", 5, dbus.Dictionary(signature="sv"))
+        self.mock.Answer("CollectTelephonyLogs", 5, NOTHING)
         self.assertEqual(velltool("tel"), "Telephony log collection: Failed\n")
+        self.mock.Fail("CollectTelephonyLogsWithCoredump", "org.example.NoModem")
+        self.assertEqual(velltool("core"), "Telephony log collection with Coredump: Failed\n")
+
+    def test_waits_and_is_content_without_a_trace_mode(self):
+        self.mock.Answer("SystemLogs.TraceMode", 5, NOTHING)
+        self.mock.Delay("CollectBasebandLogs", 200)
+        self.assertIn("/log-bb-T.tar\n", velltool("bb", "tar"))
 
     def test_is_refused_by_a_manager_that_stops(self):
         self.mock.ChangeServerState("Stopping")
