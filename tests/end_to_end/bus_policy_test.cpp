@@ -77,6 +77,6 @@ TEST(BusPolicy, LetsOnlyRootServeCommandAndSpeakForTheManager) {
         sd_bus_wait(opened, UINT64_MAX);
       }
     }
-    EXPECT_EQ(heard, signals);
+    EXPECT_EQ(heard, signals) << user;
   }
 }

@@ -15,6 +15,7 @@
 #include <cstdlib>
 #include <future>
 #include <memory>
+#include <thread>
 
 namespace {
 
@@ -28,12 +29,17 @@ class Client : public testing::Test {
     device.emplace(profile);
     setenv("DBUS_SYSTEM_BUS_ADDRESS", device->busAddress().c_str(), 1);
     manager = vell::client::CreateManager("test", queue);
+    onQueue([&] { queueThread = std::this_thread::get_id(); });
   }
+
+  /// Whether the call comes from the queue that was handed in.
+  void expectOnQueue() const { EXPECT_EQ(std::this_thread::get_id(), queueThread); }
 
   /// Collects the states that events tell, the present one first.
   void collectStates() {
     vell::client::RegisterEventHandler(manager, vell::kEventServerStateChange,
                                        [this](const MessageDict& payload, const WorkGroup&) {
+                                         expectOnQueue();
                                          states.push_back(payload.getString(vell::kKeyServerState));
                                        });
     vell::client::EventsOn(manager);
@@ -57,7 +63,8 @@ class Client : public testing::Test {
     request.set(vell::kKeyTraceAction, vell::kCollectTelephonyLogs);
     PerformCommand(
         manager, vell::kCommandTraceDumpState,
-        [answered](const CommandResult& result, const MessageDict& reply) {
+        [this, answered](const CommandResult& result, const MessageDict& reply) {
+          expectOnQueue();
           EXPECT_FALSE(reply.isDictionary());
           answered->set_value(result.status);
         },
@@ -75,6 +82,7 @@ class Client : public testing::Test {
   States states;  // that events have told of
   std::optional<SimulatedDevice> device;
   const WorkQueue queue = WorkQueue::create("test");
+  std::thread::id queueThread;
   std::shared_ptr<vell::client::Manager> manager;
 };
 
@@ -94,6 +102,10 @@ class Peer {
   void sendEvent(const char* state) const {
     send(kPath, kName, "Event", "sv", vell::kEventServerStateChange, "a{sv}", 1,
          vell::kKeyServerState, "s", state);
+  }
+
+  void sendEventWithoutDictionary() const {
+    send(kPath, kName, "Event", "sv", vell::kEventServerStateChange, "s", "Started");
   }
 
   void sendOwnerChange(const char* from, const char* to) const {
@@ -195,14 +207,15 @@ TEST_F(Client, BelievesOnlyTheBusAndTheOwnerOfTheManagersName) {
   expectStates({"Stopped"});
   owner.takeName();
   owner.sendEvent("Starting");
+  owner.sendEventWithoutDictionary();
   stranger.sendEvent("Started");
   stranger.sendOwnerChange(":1.1", "");
-  expectStates({"Stopped", "Starting"});
+  expectStates({"Stopped", "Starting", ""});
   owner.releaseName();
   owner.sendEvent("Started");
   owner.answerUpTo("Get");  // which was asked while it owned the name
   owner.sendEvent("Started");
-  expectStates({"Stopped", "Starting", "Stopped"});
+  expectStates({"Stopped", "Starting", "", "Stopped"});
 
   owner.takeName();
   owner.sendEvent("Starting");
@@ -210,7 +223,7 @@ TEST_F(Client, BelievesOnlyTheBusAndTheOwnerOfTheManagersName) {
   owner.answerUpTo("PerformCommand");
   // The owner's word that no manager runs is not the bus's.
   EXPECT_EQ(answer.get(), kStatusBusFailure);
-  expectStates({"Stopped", "Starting", "Stopped", "Starting", "Started"});
+  expectStates({"Stopped", "Starting", "", "Stopped", "Starting", "Started"});
 
   bus.reset();
   bus = device->serve("bus");
@@ -241,6 +254,7 @@ TEST_F(Client, WaitsForTheHelperWithinItsTimeLimit) {
     MessageDict request;
     request.set(vell::helper::kKeyTimeout, milliseconds);
     MessageDict reply;
+    SCOPED_TRACE(milliseconds);
     const auto start = std::chrono::steady_clock::now();
     const auto result = vell::HelperClient::create("test", nullptr)
                             ->perform(4, vell::helper::kCommandTidewellStatus, request, reply);

@@ -49,6 +49,7 @@ TEST(ManagerLife, ToolFollowsTheManagerAndTheBus) {
   EXPECT_EQ(tool.readUntil(kPrompt), kPrompt);
   EXPECT_EQ(answerTo(tool, "logdump tel"), kPrompt);
   for (int life = 0; life < 2; ++life) {
+    SCOPED_TRACE(life);
     auto bus = device.serve("bus");
     auto manager = device.serve("manager");
     EXPECT_EQ(manager.readLine(), "OpenClient \"velltool\"");

@@ -4,6 +4,10 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+
+using namespace std::chrono_literals;
+
 TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
 #ifdef VELL_SANITIZED
   GTEST_SKIP() << "A sanitizer needs an address space without limits.";
@@ -18,9 +22,15 @@ TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
 TEST(Output, HasEachLineOutBeforeTheNextIsBegun) {
   for (const std::string profile :
        {"TRACE_DUMP_STATE=answer", "TRACE_DUMP_STATE=status:1", "Baseband.TraceEnabled=no"}) {
+    SCOPED_TRACE(profile);
     const SimulatedDevice device("RADIO_TYPE=1\nBaseband.TraceEnabled=yes\n" + profile);
+    const auto start = std::chrono::steady_clock::now();
     auto tool = device.start({VELLTOOL_PATH, "logdump", "tel", "--", "logdump", "core", "--",
                               "logdump", "bb", "--", "help"});
+    tool.readSome("a result");
+    // The first half second is the manager's, to tell its state.
+    const auto taken = std::chrono::steady_clock::now() - start;
+    EXPECT_TRUE(taken >= 500ms && taken < 10s) << taken / 1ms;
     const auto result = tool.finish();
     EXPECT_TRUE(result.status == 0 && tool.wroteEachLineAtOnce()) << result;
   }

@@ -26,6 +26,7 @@ TEST(SystemLog, TakesLongMessagesWholeAndHoldsTheToolUpForASecondInAll) {
   for (const auto& [line, path] :
        {std::pair(R"(exec "$0" help)", (device.root() / "etc/vell/device.conf").string()),
         {onMachine, "/etc/vell/device.conf"}}) {
+    SCOPED_TRACE(line);
     if (line == onMachine && device.runLine("unshare -rm true").status != 0) {
       GTEST_SKIP() << "There is no mount namespace to be had.";
     }
@@ -70,6 +71,7 @@ TEST(SystemLog, TakesTheFaultsOfSettingsOnce) {
        kPrompt + failure + kPrompt + failure + kPrompt,
        {traces + ": not a file"}}};
   for (const auto& [change, output, messages] : cases) {
+    SCOPED_TRACE(change);
     const auto line = change + R"( && printf 'logdump bb\nlogdump bb\n' | "$0")";
     EXPECT_EQ(device.runLine(line, {profile, traces}).output, output);
     EXPECT_EQ(log.messages(), messages);

@@ -68,7 +68,7 @@ void TestProcess::write(const std::string& text) const {
 
 std::string TestProcess::readUntil(const std::string& text) {
   while (unreadOutput.find(text) == std::string::npos) {
-    if (!readSome()) {
+    if (!readSome(text)) {
       giveUp(text);
     }
   }
@@ -89,7 +89,7 @@ void TestProcess::sendSignal(int signalNumber) const {
 
 ProcessResult TestProcess::finish() {
   input = FileDescriptor();
-  while (readSome()) {
+  while (readSome("the end")) {
   }
   // It is reaped later, so that until then its number is no other process's.
   siginfo_t end{};
@@ -99,11 +99,11 @@ ProcessResult TestProcess::finish() {
           std::exchange(unreadOutput, ""), writtenErrors()};
 }
 
-bool TestProcess::readSome() {
+bool TestProcess::readSome(const std::string& awaited) {
   constexpr int kPatienceMilliseconds = 60'000;
   pollfd readable{output.get(), POLLIN, 0};
   if (poll(&readable, 1, kPatienceMilliseconds) == 0) {
-    giveUp("more output");
+    giveUp(awaited);
   }
   std::array<char, PIPE_BUF> buffer{};
   const auto count = read(output.get(), buffer.data(), buffer.size());

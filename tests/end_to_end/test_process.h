@@ -44,8 +44,9 @@ class TestProcess {
   /// The next line of standard output, without its newline.
   std::string readLine();
 
-  /// Waits for more standard output and keeps it for the calls that take it. False at the end.
-  bool readSome();
+  /// Waits for more standard output and keeps it for the calls that take it. False at the end. A
+  /// wait that is given up names what was `awaited`.
+  bool readSome(const std::string& awaited = "more output");
 
   /// Whether each write to standard output so far ended with its first line break, if it had any.
   [[nodiscard]] bool wroteEachLineAtOnce() const { return eachLineAtOnce; }

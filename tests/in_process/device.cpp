@@ -43,8 +43,9 @@ std::shared_ptr<vell::client::Manager> vell::client::CreateManager(const std::st
 }
 
 void vell::client::RegisterEventHandler(std::shared_ptr<Manager>, const std::string& eventName,
-                                        EventHandler) {
+                                        EventHandler handler) {
   device.clientCalls.push_back("RegisterEventHandler " + eventName);
+  device.eventHandler = std::move(handler);
 }
 
 void vell::client::EventsOn(std::shared_ptr<Manager>) {

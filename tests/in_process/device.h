@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/manager_client.h"
+
 #include <string>
 #include <vector>
 
@@ -11,7 +13,8 @@ struct Device {
   int productCode = 0;
   int radioVendor = 0;
   std::string programName = "velltool";
-  std::vector<std::string> clientCalls;  ///< What was done to the client of the manager.
+  std::vector<std::string> clientCalls;     ///< What was done to the client of the manager.
+  vell::client::EventHandler eventHandler;  ///< As the client was given it, for events of a test.
 };
 
 /// The device there is.

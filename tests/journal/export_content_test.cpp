@@ -53,6 +53,7 @@ TEST(ExportLines, ShowEachFieldFromWhereItIs) {
       {{{"MESSAGE", "ä\x80 \xE2\x82"}, {"_COMM", "p\xFF"}, {"VELL_SUBSYSTEM", "s\xC3"},
         {"VELL_SENDER_IMAGE_PATH", "/\xFE/i\xC0\xAF"}, {"VELL_CATEGORY", "c\xF5"}},
        kShown + "0x00000 0x0 0 p\uFFFD(i\uFFFD\uFFFD):s\uFFFD [c\uFFFD] ä\uFFFD \uFFFD\n"},
+      {{{"MESSAGE", "of two"}, {"MESSAGE", "not this"}}, kNothing + "of two\n"},
       {{{"PRIORITY", "3"}, {"_COMM", "without a message"}}, ""}};
   // clang-format on
   DeviceJournal device;

@@ -24,6 +24,7 @@ namespace {
 TEST(BatchQueue, TakesBatchesUpToItsBoundsUntilItIsClosed) {
   // How large each batch is, and how many have room.
   for (const auto& [bytes, most] : {std::pair(0U, 24), {1U << 20, 6}, {7U << 20, 1}}) {
+    SCOPED_TRACE(most);
     BatchQueue queue;
     std::counting_semaphore<> pushes(0);
     std::thread pushing([&queue, &pushes, text = std::string(bytes, 'x')] {

@@ -1,9 +1,11 @@
 #include "tool/vell_shell.h"
 
 #include "logdump/os_log_context.h"
+#include "platform/manager_names.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"
 #include "tests/unit/console.h"
+#include "tool/server_state.h"
 
 #include <gtest/gtest.h>
 #include <pthread.h>
@@ -18,6 +20,21 @@ TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
                                       "RegisterEventHandler ServerStateChange", "EventsOff",
                                       "EventsOn"}));
   EXPECT_EQ(in_process::logDevice.longestWait, std::chrono::milliseconds(500));
+
+  const auto event = [](const char* key, MessageDict::Value state) {
+    return MessageDict::fromEntries({{key, std::move(state)}});
+  };
+  const std::pair<const char*, MessageDict> others[] = {
+      {"no dictionary", MessageDict::notADictionary()},
+      {"no key", event("State", "Started")},
+      {"another type", event(vell::kKeyServerState, true)},
+      {"another state", event(vell::kKeyServerState, "started")}};
+  for (const auto& [other, payload] : others) {
+    in_process::device.eventHandler(event(vell::kKeyServerState, "Started"), {});
+    EXPECT_TRUE(IsServerRunning()) << other;
+    in_process::device.eventHandler(payload, {});
+    EXPECT_FALSE(IsServerRunning()) << other;
+  }
 }
 
 TEST(VellShell, FailsWhenItsWorkQueueCannotBeStarted) {
