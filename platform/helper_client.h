@@ -6,6 +6,8 @@
 #include <cstdint>
 #include <memory>
 
+class BusConnection;
+
 namespace vell {
 
 /// A log server for the helper's client to write through. The tool hands in none.
@@ -38,11 +40,9 @@ class HelperClient {
                         MessageDict& reply);
 
  private:
-  class Connection;
+  explicit HelperClient(std::unique_ptr<BusConnection> opened);
 
-  explicit HelperClient(std::unique_ptr<Connection> opened);
-
-  std::unique_ptr<Connection> connection;
+  std::unique_ptr<BusConnection> connection;
 };
 
 }  // namespace vell

@@ -135,7 +135,6 @@ void BusConnection::process() {
 
 void BusConnection::becomeReady() {
   ready = true;
-  distrusted = false;
   if (hooks.connected) {
     hooks.connected(bus.get());
   }

@@ -70,8 +70,8 @@ class BusConnection {
   /// whatever happens, and then released. From any thread.
   void call(BusCall call, ReplyHandler handler);
 
-  /// Runs `task` on the connection's thread, after the calls and tasks handed in before. From any
-  /// thread.
+  /// Runs `task` on the connection's thread, after the calls and tasks handed in before; when
+  /// called there, at once. From any thread.
   void post(std::function<void()> task);
 
  private:
@@ -118,8 +118,8 @@ class BusConnection {
   std::list<Pending> pendingCalls;
 
   std::mutex mutex;
-  std::vector<std::function<void()>> posted;  // guarded by mutex
-  bool stopping = false;                      // guarded by mutex
+  std::vector<std::function<void()>> posted;  ///< Guarded by `mutex`.
+  bool stopping = false;                      ///< Guarded by `mutex`.
 
   std::thread thread;
 };

@@ -8,7 +8,6 @@
 #include <algorithm>
 #include <chrono>
 #include <future>
-#include <optional>
 #include <string>
 #include <utility>
 
@@ -34,45 +33,34 @@ std::chrono::milliseconds patienceOf(const MessageDict& request) {
 
 }  // namespace
 
-class vell::HelperClient::Connection {
- public:
-  explicit Connection(const char* name) : bus(name, {}) {}
-
-  std::future<BusAnswer> perform(helper::TaskID task, const char* command,
-                                 const MessageDict& request) {
-    const auto promise = std::make_shared<std::promise<BusAnswer>>();
-    bus.call(
-        {kHelperBusName, kHelperPath, kHelperInterface, "Perform",
-         [task, command = std::string(command), request](sd_bus_message* message) {
-           return sd_bus_message_append(message, "u", task) >= 0 && appendText(message, command) &&
-                  appendDictionary(message, request);
-         }},
-        [promise](BusOutcome outcome, sd_bus_message* reply) {
-          promise->set_value(outcome == BusOutcome::answered
-                                 ? readAnswer(reply, AnswerForm::statusReply)
-                                 : failedAnswer(kStatusBusFailure, "The helper did not answer"));
-        });
-    return promise->get_future();
-  }
-
- private:
-  BusConnection bus;
-};
-
-vell::HelperClient::HelperClient(std::unique_ptr<Connection> opened)
+vell::HelperClient::HelperClient(std::unique_ptr<BusConnection> opened)
     : connection(std::move(opened)) {}
 
 vell::HelperClient::~HelperClient() = default;
 
 std::shared_ptr<vell::HelperClient> vell::HelperClient::create(
     const char* name, std::shared_ptr<LogServer> /*logServer*/) {
-  return std::shared_ptr<HelperClient>(new HelperClient(std::make_unique<Connection>(name)));
+  auto opened = std::make_unique<BusConnection>(name, BusConnection::Hooks());
+  return std::shared_ptr<HelperClient>(new HelperClient(std::move(opened)));
 }
 
 CommandResult vell::HelperClient::perform(helper::TaskID task, const char* command,
                                           MessageDict request, MessageDict& reply) {
   const auto patience = patienceOf(request);
-  auto answered = connection->perform(task, command, request);
+  const auto promise = std::make_shared<std::promise<BusAnswer>>();
+  auto answered = promise->get_future();
+  connection->call(
+      {kHelperBusName, kHelperPath, kHelperInterface, "Perform",
+       [task, command = std::string(command),
+        request = std::move(request)](sd_bus_message* message) {
+         return sd_bus_message_append(message, "u", task) >= 0 && appendText(message, command) &&
+                appendDictionary(message, request);
+       }},
+      [promise](BusOutcome outcome, sd_bus_message* answer) {
+        promise->set_value(outcome == BusOutcome::answered
+                               ? readAnswer(answer, AnswerForm::statusReply)
+                               : failedAnswer(kStatusBusFailure, "The helper did not answer"));
+      });
   if (answered.wait_for(patience) != std::future_status::ready) {
     reply = MessageDict::notADictionary();
     return {kStatusBusFailure, "The helper did not answer in time"};

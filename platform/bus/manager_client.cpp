@@ -25,11 +25,17 @@ BusCall managerCall(const char* interface, const char* member,
   return {kBusName, kObjectPath, interface, member, std::move(fill)};
 }
 
+/// One command, on its way and until it is answered.
+struct Request {
+  std::string command;
+  MessageDict dict;
+};
+
 /// Answers a command while no manager runs: from the saved traces where they can.
-BusAnswer answerWithoutManager(const std::string& command, const MessageDict& request) {
-  const auto saved = command == vell::kCommandGetTraceProperty
-                         ? savedTraceProperty(request.getString(vell::kKeyTraceName),
-                                              request.getString(vell::kKeyTracePropertyName))
+BusAnswer answerWithoutManager(const Request& request) {
+  const auto saved = request.command == vell::kCommandGetTraceProperty
+                         ? savedTraceProperty(request.dict.getString(vell::kKeyTraceName),
+                                              request.dict.getString(vell::kKeyTracePropertyName))
                          : std::nullopt;
   if (!saved) {
     return failedAnswer(vell::kStatusManagerNotRunning, "The manager is not running");
@@ -90,39 +96,36 @@ class Subscriptions {
     return on != nullptr;
   }
 
-  /// Whether `deliver` would call anybody.
-  bool listenTo(const std::string& eventName) const {
-    const std::lock_guard lock(mutex);
-    return on != nullptr && handlers.contains(eventName);
-  }
-
-  void deliver(const std::string& eventName, MessageDict payload) const {
+  /// Takes the payload of an event of that name to the queue. Empty when nobody listens to it.
+  std::function<void(MessageDict)> listener(const std::string& eventName) const {
     const std::lock_guard lock(mutex);
     const auto found = handlers.find(eventName);
     if (!on || found == handlers.end()) {
-      return;
+      return nullptr;
     }
-    // Asked again on the queue: delivery may have been switched off while the event waited there.
-    queue.submit([delivery = on, handler = found->second, event = std::move(payload)] {
-      const std::lock_guard handling(delivery->mutex);
-      if (delivery->on) {
-        (*handler)(event, WorkGroup::create());
-      }
-    });
+    return [this, delivery = on, handler = found->second](MessageDict payload) {
+      queue.submit([delivery, handler, event = std::move(payload)]() mutable {
+        // Asked again: delivery may have been switched off while the event waited on the queue.
+        const std::lock_guard handling(delivery->mutex);
+        if (delivery->on) {
+          (*handler)(std::move(event), WorkGroup::create());
+        }
+      });
+    };
   }
 
  private:
   /// Lives from one EventsOn to the next EventsOff or EventsOn.
   struct Delivery {
-    std::recursive_mutex mutex;  // held while a handler runs, which may itself end the delivery
-    bool on = true;              // guarded by mutex
+    std::recursive_mutex mutex;  ///< Held while a handler runs, which may itself end the delivery.
+    bool on = true;              ///< Guarded by `mutex`.
   };
 
   const WorkQueue queue;
   mutable std::mutex mutex;
   std::map<std::string, std::shared_ptr<const vell::client::EventHandler>>
-      handlers;                  // guarded by mutex
-  std::shared_ptr<Delivery> on;  // guarded by mutex; empty while delivery is off
+      handlers;                  ///< Guarded by `mutex`.
+  std::shared_ptr<Delivery> on;  ///< Guarded by `mutex`. Empty while delivery is off.
 };
 
 }  // namespace
@@ -140,24 +143,25 @@ class vell::client::Manager {
   Manager& operator=(const Manager&) = delete;
   ~Manager() { subscriptions.switchOff(); }
 
-  void perform(const std::string& command, const MessageDict& request,
-               std::function<void(BusAnswer)> handler) {
-    connection.call(managerCall(kInterface, "PerformCommand",
-                                [command, request](sd_bus_message* message) {
-                                  return appendText(message, command) &&
-                                         appendDictionary(message, request);
-                                }),
-                    [command, request, handler = std::move(handler)](BusOutcome outcome,
-                                                                     sd_bus_message* reply) {
-                      switch (outcome) {
-                        case BusOutcome::answered:
-                          return handler(readAnswer(reply, AnswerForm::statusMessageReply));
-                        case BusOutcome::noOwner:
-                          return handler(answerWithoutManager(command, request));
-                        case BusOutcome::failed:
-                          return handler(failedAnswer(kStatusBusFailure, "The bus failed"));
-                      }
-                    });
+  void perform(std::string command, MessageDict dict, std::function<void(BusAnswer)> handler) {
+    const auto request =
+        std::make_shared<const Request>(Request{std::move(command), std::move(dict)});
+    connection.call(
+        managerCall(kInterface, "PerformCommand",
+                    [request](sd_bus_message* message) {
+                      return appendText(message, request->command) &&
+                             appendDictionary(message, request->dict);
+                    }),
+        [request, handler = std::move(handler)](BusOutcome outcome, sd_bus_message* reply) {
+          switch (outcome) {
+            case BusOutcome::answered:
+              return handler(readAnswer(reply, AnswerForm::statusMessageReply));
+            case BusOutcome::noOwner:
+              return handler(answerWithoutManager(*request));
+            case BusOutcome::failed:
+              return handler(failedAnswer(kStatusBusFailure, "The bus failed"));
+          }
+        });
   }
 
   void switchEventsOn() {
@@ -241,18 +245,23 @@ class vell::client::Manager {
   }
 
   void tellState(MessageDict::Value state) {
-    subscriptions.deliver(kEventServerStateChange, stateEvent(std::move(state)));
+    if (const auto tell = subscriptions.listener(kEventServerStateChange)) {
+      tell(stateEvent(std::move(state)));
+    }
     stateTold = true;
   }
 
   static int onEvent(sd_bus_message* signal, void* userdata, sd_bus_error* /*error*/) {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* name = nullptr;
+    if (!isFrom(signal, manager.owner) || sd_bus_message_has_signature(signal, "sv") <= 0 ||
+        sd_bus_message_read(signal, "s", &name) <= 0) {
+      return 0;
+    }
+    const auto tell = manager.subscriptions.listener(name);
     MessageDict payload;
-    if (isFrom(signal, manager.owner) && sd_bus_message_has_signature(signal, "sv") > 0 &&
-        sd_bus_message_read(signal, "s", &name) > 0 && manager.subscriptions.listenTo(name) &&
-        readPayload(signal, payload)) {
-      manager.subscriptions.deliver(name, std::move(payload));
+    if (tell && readPayload(signal, payload)) {
+      tell(std::move(payload));
     }
     return 0;
   }
@@ -305,11 +314,11 @@ void vell::client::EventsOff(std::shared_ptr<Manager> manager) {
 void vell::client::PerformCommand(std::shared_ptr<Manager> manager, const std::string& command,
                                   Completion completion, MessageDict request) {
   manager->perform(
-      command, request,
+      command, std::move(request),
       [queue = manager->queue, completion = std::move(completion)](BusAnswer answer) mutable {
         // Moved on, so that its last copy is released where it runs.
-        queue.submit([completion = std::move(completion), answer = std::move(answer)] {
-          completion(answer.result, answer.reply);
+        queue.submit([completion = std::move(completion), answer = std::move(answer)]() mutable {
+          completion(std::move(answer.result), std::move(answer.reply));
         });
       });
 }
@@ -319,7 +328,7 @@ CommandResult vell::client::PerformCommand(std::shared_ptr<Manager> manager,
                                            MessageDict* reply) {
   const auto answered = std::make_shared<std::promise<BusAnswer>>();
   auto answer = answered->get_future();
-  manager->perform(command, request,
+  manager->perform(command, std::move(request),
                    [answered](BusAnswer given) { answered->set_value(std::move(given)); });
   auto given = answer.get();
   *reply = std::move(given.reply);

@@ -21,7 +21,7 @@ const char* getprogname() { return device.programName.c_str(); }
 
 // clang-format on
 
-class vell::HelperClient::Connection {};
+class BusConnection {};
 
 vell::HelperClient::~HelperClient() = default;
 
