@@ -77,14 +77,10 @@ std::optional<JournalPlace> placeAfter(sd_journal* journal, int (*step)(sd_journ
   return step(journal) > 0 ? JournalPlace::fromCursor(cursorOf(journal)) : std::nullopt;
 }
 
-/// Raises the soft limit of open files, which is kept low for programs that use select(2), as far
-/// as it can be. Returns how many files may be held open: half of it, which leaves the rest to the
-/// process.
-std::size_t raiseFileLimit() {
+/// How many files may be held open: half of what the process may, which leaves it the rest.
+std::size_t mostHeldOpen() {
   struct rlimit limit {};
   getrlimit(RLIMIT_NOFILE, &limit);
-  limit.rlim_cur = limit.rlim_max;
-  setrlimit(RLIMIT_NOFILE, &limit);
   return std::max<std::size_t>(limit.rlim_cur / 2, 1);
 }
 
@@ -183,7 +179,7 @@ class Finder {
 
   std::uint64_t from;
   std::size_t atMost;
-  std::size_t mostOpen = raiseFileLimit();
+  std::size_t mostOpen = mostHeldOpen();
   std::set<std::pair<dev_t, ino_t>> known;  ///< The regular files that were opened.
 };
 

@@ -50,8 +50,8 @@ struct JournalFiles {
 /// those of namespaces are not among them. A file that is rotated meanwhile is found under its new
 /// name. Leaves out files that end before `from`, in microseconds. Stops after `atMost` files.
 ///
-/// Raises the process's soft limit of open files to the hard limit. When there are more files than
-/// half of that, the files that end first are given up, which counts as damage. From any thread.
+/// When there are more files than half of what the process may have open, the files that end first
+/// are given up, which counts as damage.
 JournalFiles findJournalFiles(std::uint64_t from,
                               std::size_t atMost = std::numeric_limits<std::size_t>::max());
 

@@ -3,14 +3,30 @@
 #include "platform/journal/entry_decoder.h"
 #include "platform/journal/journal_files.h"
 
+#include <sys/resource.h>
+
 #include <algorithm>
 #include <utility>
+
+namespace {
+
+/// Raises the soft limit of open files, which is kept low for programs that use select(2), as far
+/// as it can be.
+void raiseFileLimit() {
+  struct rlimit limit {};
+  getrlimit(RLIMIT_NOFILE, &limit);
+  limit.rlim_cur = limit.rlim_max;
+  setrlimit(RLIMIT_NOFILE, &limit);
+}
+
+}  // namespace
 
 JournalReader::JournalReader(const std::optional<LogFilter>& filter, LogTime from)
     : selection(filter), start(from) {
   // A time of 0 stands for none.
   const auto earliest =
       static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 1));
+  raiseFileLimit();
   auto found = findJournalFiles(earliest);
   complete = !found.damaged;
   for (auto& journalFile : found.found) {

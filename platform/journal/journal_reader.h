@@ -16,7 +16,8 @@
 /// one thread, which reads no other journal.
 class JournalReader {
  public:
-  /// Finds the files. Without a filter every entry is selected.
+  /// Finds the files. Without a filter every entry is selected. Raises the process's soft limit of
+  /// open files to the hard limit.
   JournalReader(const std::optional<LogFilter>& filter, LogTime from);
 
   /// Appends entries to `batch` until it is full. Returns with fewer, or none, after looking at
