@@ -1,8 +1,6 @@
-#include "logdump/baseband_logs.h"
-
+#include "logdump/handlers.h"
 #include "logdump/logdump_args.h"
 #include "logdump/logdump_command.h"
-#include "logdump/system_logs_trace.h"
 #include "logdump/trace_paths.h"
 #include "logdump/trace_value.h"
 #include "platform/compression.h"

@@ -1,14 +1,17 @@
 #include "logdump/logdump_command.h"
 
-#include "logdump/baseband_logs.h"
-#include "logdump/os_log_handler.h"
-#include "logdump/telephony_logs.h"
+#include "logdump/handlers.h"
 #include "tool/server_state.h"
 
 #include <iostream>
 #include <utility>
 
 const char* const kServerDownErrorPrint = "Server is not running. Please try after server starts.";
+
+const LogContext& GetOsLogContext() {
+  static const LogContext context{"org.velltool", "global"};
+  return context;
+}
 
 std::shared_ptr<CommandBase> LogdumpCommand::create(std::string name,
                                                     std::weak_ptr<CommandBase> parent,

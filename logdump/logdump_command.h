@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/system_log.h"
 #include "tool/vell_command_base.h"
 
 #include <memory>
@@ -7,6 +8,10 @@
 
 /// What a refused command is answered with on standard error.
 extern const char* const kServerDownErrorPrint;
+
+/// The tool's log context: made on the first call, exactly once, and the same on every call until
+/// the process exits.
+const LogContext& GetOsLogContext();
 
 /// The node "logdump": its four handlers collect logs.
 class LogdumpCommand : public VellCommandBase {

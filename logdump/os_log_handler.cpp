@@ -1,5 +1,4 @@
-#include "logdump/os_log_handler.h"
-
+#include "logdump/handlers.h"
 #include "logdump/os_log_stream.h"
 
 #include <algorithm>

@@ -1,9 +1,8 @@
-#include "logdump/telephony_logs.h"
-
+#include "logdump/handlers.h"
 #include "logdump/logdump_args.h"
 #include "logdump/logdump_command.h"
-#include "logdump/system_logs_trace.h"
 #include "logdump/trace_paths.h"
+#include "logdump/trace_value.h"
 #include "platform/compression.h"
 #include "platform/manager_client.h"
 #include "platform/manager_names.h"

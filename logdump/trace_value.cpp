@@ -1,11 +1,16 @@
 #include "logdump/trace_value.h"
 
+#include "logdump/logdump_command.h"
+#include "platform/manager_client.h"
+#include "platform/manager_names.h"
 #include "platform/text.h"
 
 #include <stdexcept>
 #include <utility>
 
 namespace {
+
+constexpr int kModeThree = 3;
 
 constexpr std::pair<const char*, int> kModeWords[] = {
     {"false", 0}, {"off", 0}, {"no", 0},   {"true", 1},
@@ -34,4 +39,14 @@ void parseTraceFlag(const std::string& text, bool& flag) {
   if (const auto mode = parseTraceMode(text)) {
     flag = *mode != 0;
   }
+}
+
+bool isSystemLogsTraceModeThree(LogdumpCommand& node) {
+  MessageDict request;
+  request.set(vell::kKeyTraceName, vell::kTraceSystemLogs);
+  request.set(vell::kKeyTracePropertyName, vell::kKeyTraceMode);
+  MessageDict reply;
+  // The result need not be examined: a command that failed leaves no dictionary.
+  vell::client::PerformCommand(node.manager, vell::kCommandGetTraceProperty, request, &reply);
+  return parseTraceMode(reply.getString(vell::kKeyTracePropertyValue)) == kModeThree;
 }

@@ -2,8 +2,8 @@
 //
 // An input is words, one a line; each is also taken for the value of a trace property.
 
+#include "logdump/handlers.h"
 #include "logdump/logdump_args.h"
-#include "logdump/os_log_handler.h"
 #include "logdump/trace_value.h"
 #include "tests/fuzz/fuzz_target.h"
 #include "tests/in_process/log_device.h"

@@ -1,6 +1,6 @@
 // The export alone, without the shell and the manager around it: its words are those of "oslog".
 
-#include "logdump/os_log_handler.h"
+#include "logdump/handlers.h"
 
 int main(int count, char** words) {
   const bool result = makeOsLogHandler()(WorkGroup(), {words + 1, words + count});

@@ -1,6 +1,6 @@
 #include "tool/vell_shell.h"
 
-#include "logdump/os_log_context.h"
+#include "logdump/logdump_command.h"
 #include "platform/manager_names.h"
 #include "tests/in_process/device.h"
 #include "tests/in_process/log_device.h"

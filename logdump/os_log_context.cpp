@@ -1,6 +1,0 @@
-#include "logdump/os_log_context.h"
-
-const LogContext& GetOsLogContext() {
-  static const LogContext context{"org.velltool", "global"};
-  return context;
-}
