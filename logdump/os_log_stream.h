@@ -15,7 +15,7 @@ class OsLogStream {
   /// Blocks until the log is read, 180 seconds at most and as long as a write under way then takes,
   /// and tells the system log what went wrong. False when the log or the file could not be opened,
   /// there was no memory for a group, a line could not be written, or the time ran out; the file
-  /// keeps the lines written so far. May be called from any thread.
+  /// keeps the lines written so far.
   static bool putOsLogStreamToFile(std::string path, std::vector<std::string> process,
                                    std::vector<std::string> imagePath, double history);
 };

@@ -20,11 +20,11 @@ extern const char* const kAlderCoreDumpSnapshotDirectorySuffix;
 extern const char* const kBirchCoreDumpSnapshotDirectorySuffix;
 
 /// The suffix of a baseband trace's directory, by the family of the device's radio. `qdss`: it is
-/// the QDSS trace. From any thread.
+/// the QDSS trace.
 std::string getBasebandTraceDirSuffix(bool qdss);
 
 /// The suffix of a core dump's directory, by the family of the device's radio. The radio is asked
-/// for on the first call only. From any thread.
+/// for on the first call only.
 std::string getCoreDumpDirSuffix();
 
 }  // namespace vell::trace

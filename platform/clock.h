@@ -5,5 +5,5 @@
 /// A point in time, UTC, in the resolution of the system log. Points before 1970 are negative.
 using LogTime = std::chrono::sys_time<std::chrono::microseconds>;
 
-/// The current time of the system's clock, which may be set back and forth. From any thread.
+/// The current time of the system's clock, which may be set back and forth.
 LogTime currentTime();

@@ -10,8 +10,8 @@ inline constexpr CompressionMode kCompressionNone = 0;
 inline constexpr CompressionMode kCompressionTarGz = 1;
 inline constexpr CompressionMode kCompressionTar = 2;
 
-/// The device's default compression mode. From any thread.
+/// The device's default compression mode.
 CompressionMode defaultCompressionMode();
 
-/// Whether the device can compress collected logs at all. From any thread.
+/// Whether the device can compress collected logs at all.
 bool compressionSupported();

@@ -8,7 +8,7 @@
 /// Leaves an empty file at `path`: one that is there loses its content, one that is not is made,
 /// readable and writable by its owner alone. A symbolic link is followed. What is no regular file
 /// (a device, a pipe, a folder) has no content to lose and is left alone. Whether it worked shows
-/// when the file is opened. From any thread.
+/// when the file is opened.
 void createEmptyFile(const std::string& path);
 
 /// A file that is open for writing; closed at the end of its life. One thread at a time.

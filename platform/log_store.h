@@ -23,7 +23,7 @@ struct LogStoreError {
   std::string description;
 };
 
-/// A log that can be read. Opaque; made by `LogStore::prepare`.
+/// Stands for the device's log, which can be read. Opaque; made by `LogStore::prepare`.
 class LogSource;
 
 /// The device's own store of log entries.
@@ -42,7 +42,7 @@ class LogStore {
   void prepare(const Completion& completion) const;
 };
 
-/// Delivers the entries of a source to a handler, on a thread of its own.
+/// Delivers the entries of the device's log to a handler, on a thread of its own.
 ///
 /// One thread makes, sets up, activates and destroys it; any may call `invalidate`. The handlers
 /// run on the reader's thread, one call at a time, and are released with it.
@@ -52,7 +52,7 @@ class LogReader {
   /// `position` is the time of the last entry that was delivered, the start when there was none.
   using InvalidationHandler = std::function<void(unsigned long reason, LogTime position)>;
 
-  /// Reads `source`, which must not be null.
+  /// `source` must not be null.
   explicit LogReader(std::shared_ptr<const LogSource> source);
   LogReader(const LogReader&) = delete;
   LogReader& operator=(const LogReader&) = delete;

@@ -1,8 +1,7 @@
 #pragma once
 
 /// The name under which the program was started: the last component of the first word of its
-/// command line, "velltool" when that is missing or empty. The text lives as long as the process;
-/// from any thread.
+/// command line, "velltool" when that is missing or empty. The text lives as long as the process.
 const char* getprogname();
 
 /// Opens the null device in place of each standard stream that the process was started without, so

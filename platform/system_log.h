@@ -8,6 +8,6 @@ struct LogContext {
   std::string category;   ///< The part of the product.
 };
 
-/// Writes one message to the system log, at the level of errors. From any thread; a message that
+/// Writes one message to the system log, at the level of errors. A message that
 /// cannot be written is dropped, because there is nowhere else to say so.
 void logSystemError(const std::string& message);

@@ -3,7 +3,7 @@
 #include <string>
 
 /// What the device says of its radio, its build and its processes. The answers of the device
-/// profile do not change while the process runs; all of these may be asked from any thread.
+/// profile do not change while the process runs.
 
 /// The type of the device's cellular radio; 0 when it has none.
 int radioType();

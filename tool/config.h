@@ -1,6 +1,6 @@
 #pragma once
 
-/// What kind of device and build the tool runs on. From any thread.
+/// What kind of device and build the tool runs on.
 namespace config {
 
 namespace hw {

@@ -3,7 +3,6 @@
 #include "platform/message_dict.h"
 
 /// Whether the manager's last server-state event said that it is up; false before the first one.
-/// From any thread.
 bool IsServerRunning();
 
 /// Takes the state out of a server-state event. Anything but the started state, spelt exactly,

@@ -15,6 +15,6 @@ struct DeviceProfile {
   bool compressionSupported = true;
 
   /// Reads the known keys of `file`, and passes over the others. A value that cannot be read
-  /// leaves the default, and a fault in `file`. From any thread.
+  /// leaves the default, and a fault in `file`.
   static DeviceProfile from(SettingsFile& file);
 };

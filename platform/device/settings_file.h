@@ -27,13 +27,13 @@ struct SettingsFile {
 
   /// Reads the file at `path`. Empty when there is no such file; one that is there and cannot be
   /// read gives a fault and no settings, a line that cannot be read gives a fault and is passed
-  /// over. From any thread.
+  /// over.
   static std::optional<SettingsFile> read(const std::filesystem::path& path);
 
   /// As `read`, from a text.
   static SettingsFile parse(const std::string& text);
 };
 
-/// Says each of `faults` in the system log, with file and line. From any thread.
+/// Says each of `faults` in the system log, with file and line.
 void reportFaults(const std::filesystem::path& path,
                   const std::vector<SettingsFile::Fault>& faults);

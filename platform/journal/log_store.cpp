@@ -13,7 +13,7 @@
 #include <thread>
 #include <utility>
 
-/// Stands for the device's journals, at least one of which can be read.
+/// Has nothing in it: a reader finds the journals that are there when it is activated.
 class LogSource {};
 
 void LogStore::prepare(const Completion& completion) const {

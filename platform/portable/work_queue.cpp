@@ -17,8 +17,8 @@ namespace {
 struct Backlog {
   std::mutex mutex;
   std::condition_variable changed;
-  std::deque<std::function<void()>> waiting;  // guarded by mutex
-  bool closed = false;                        // guarded by mutex
+  std::deque<std::function<void()>> waiting;  ///< Guarded by `mutex`.
+  bool closed = false;                        ///< Guarded by `mutex`.
 };
 
 /// The next closure, waited for; none once the queue is closed and has run everything.

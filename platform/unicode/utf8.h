@@ -3,13 +3,13 @@
 #include <string>
 #include <string_view>
 
-/// Whether `bytes` are valid UTF-8 (RFC 3629). From any thread.
+/// Whether `bytes` are valid UTF-8 (RFC 3629).
 bool isValidUtf8(std::string_view bytes);
 
 /// `bytes` as valid UTF-8 (RFC 3629): each broken sequence, as long as it can be read as one,
-/// becomes U+FFFD; well-formed text comes back as it is. From any thread.
+/// becomes U+FFFD; well-formed text comes back as it is.
 std::string validUtf8(std::string_view bytes);
 
 /// As `validUtf8`, and U+FFFD in place of each NUL and each noncharacter too (Unicode Standard,
-/// chapter 23.7), which not every program takes as text. From any thread.
+/// chapter 23.7), which not every program takes as text.
 std::string interchangeText(std::string_view bytes);
