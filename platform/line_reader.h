@@ -22,6 +22,6 @@ using Completer = std::function<Completions(const std::string& text)>;
 /// Where both are terminals that can do it, the line can be edited, the Tab key asks `complete`,
 /// and the process's earlier lines come back: a letter with its accents counts as one, and what is
 /// no UTF-8 is passed over. What is typed between two calls waits unseen for the next. The terminal
-/// is then set as it was found when the process exits, is stopped from the keyboard, or ends by a
-/// signal that can be caught. All calls are from the same thread.
+/// is then set as it was found when the process exits (std::exit, std::quick_exit), is stopped from
+/// the keyboard, or ends by a signal that can be caught. All calls are from the same thread.
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete);

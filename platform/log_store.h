@@ -74,8 +74,7 @@ class LogReader {
   /// Starts delivering and returns at once. To be called once. Delivers the entries whose time is
   /// not before `from` and that are stored when the reading starts, which is presently; none that
   /// is logged later. They come in the order of being stored, also when the clock was set back, as
-  /// far as the log tells that order; their own times may differ from it. When no thread can be
-  /// had, the invalidation handler is called at once, on the calling thread.
+  /// far as the log tells that order; their own times may differ from it.
   void activate(LogTime from);
 
   /// Stops the reader. No handler is called any more, except that one call which has begun, or is

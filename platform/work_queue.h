@@ -7,21 +7,13 @@
 /// A serial work queue: closures run one at a time, in the order of their submission, on a thread
 /// of the queue's own.
 ///
-/// A WorkQueue is a handle: copies share one queue. A default-made handle is absent (it has no
-/// queue); only `operator bool` and destruction may be used on it. When the last handle is released
-/// the closures already submitted still run, then the thread ends; the release waits for that
-/// unless it happens on the queue's own thread. Every operation may be called from any thread.
+/// A WorkQueue is a handle: copies share one queue. When the last handle is released the closures
+/// already submitted still run, then the thread ends; the release waits for that unless it happens
+/// on the queue's own thread. Every operation may be called from any thread.
 class WorkQueue {
  public:
-  /// An absent queue.
-  WorkQueue() = default;
-
-  /// Starts a queue; gives an absent one when no thread can be started. `label` names it for
-  /// people, in the list of threads, too.
+  /// Starts a queue. `label` names it for people, in the list of threads, too.
   static WorkQueue create(std::string label);
-
-  /// Whether this handle has a queue.
-  explicit operator bool() const { return worker != nullptr; }
 
   /// The label given at the start.
   [[nodiscard]] const std::string& label() const;
@@ -32,6 +24,8 @@ class WorkQueue {
 
  private:
   class Worker;
+
+  WorkQueue() = default;
 
   std::shared_ptr<Worker> worker;
 };

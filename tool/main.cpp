@@ -1,13 +1,11 @@
 #include "framework/command_shell.h"
 #include "platform/program.h"
 #include "platform/telephony.h"
+#include "platform/threads.h"
 #include "tool/config.h"
 #include "tool/vell_shell.h"
 
-#include <pthread.h>
-
 #include <cstdlib>
-#include <cstring>
 #include <iostream>
 #include <list>
 #include <memory>
@@ -25,9 +23,10 @@ bool daemonsAreReady() {
   return config::hw::watch() || telephonyRunning || processRunning(kBasebandHostDaemon);
 }
 
-/// The shell thread: runs the shell on the word list at `argument` and ends the process.
-void* runShellThread(void* argument) {
-  const auto words = *static_cast<const std::list<std::string>*>(argument);
+/// The shell thread: takes the signals that the process was started with, runs the shell on
+/// `words` and ends the process.
+void runShellThread(const std::list<std::string>& words, const sigset_t& blockedSignals) {
+  pthread_sigmask(SIG_SETMASK, &blockedSignals, nullptr);
   // Never destroyed: the process ends with the tree and the client alive.
   const std::shared_ptr<VellShell> shell(new VellShell);
   const bool result = shell->run(words);
@@ -41,7 +40,7 @@ void* runShellThread(void* argument) {
 
 int main(int count, char* vector[]) {
   prepareStandardStreams();
-  auto words = CommandShell::convertCmdArgsToList(count, vector);
+  const auto words = CommandShell::convertCmdArgsToList(count, vector);
   if (radioType() == 0) {
     std::cout << "'velltool' is not supported on this product." << std::endl;
     return kRefusedToStart;
@@ -52,12 +51,11 @@ int main(int count, char* vector[]) {
               << std::endl;
     return kRefusedToStart;
   }
-  pthread_t shellThread = {};
-  const int error = pthread_create(&shellThread, nullptr, runShellThread, &words);
-  if (error != 0) {
-    std::cerr << "velltool: cannot start the shell thread: " << std::strerror(error) << std::endl;
-    return EXIT_FAILURE;
-  }
+  // From here on, signals are the shell thread's: it reads from the terminal.
+  const auto blockedBefore = blockSignals();
+  startThread("velltool.shell", [words, blockedBefore] {
+    runShellThread(words, blockedBefore);
+  }).detach();
   runMainEventLoop();
   return EXIT_SUCCESS;
 }

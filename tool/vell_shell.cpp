@@ -9,7 +9,6 @@
 #include "tool/vell_command.h"
 
 #include <chrono>
-#include <iostream>
 #include <string>
 #include <utility>
 
@@ -36,10 +35,6 @@ void subscribeToServerState(const std::shared_ptr<vell::client::Manager>& manage
 
 std::shared_ptr<CommandBase> VellShell::createRootCommand() {
   const auto queue = WorkQueue::create(kQueueLabel);
-  if (!queue) {
-    std::cerr << "velltool: cannot start the work queue's thread" << std::endl;
-    return nullptr;
-  }
   const auto manager = vell::client::CreateManager(kClientName, queue);
   const auto group = WorkGroup::create();
   {

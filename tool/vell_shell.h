@@ -8,7 +8,6 @@
 class VellShell : public CommandShell {
  private:
   /// Opens the manager client, follows its server state, gives the first state event 500 ms to
-  /// arrive, and builds the root, named after the program. Empty only when the work queue cannot
-  /// be started, which has then been said on standard error.
+  /// arrive, and builds the root, named after the program. Never empty.
   std::shared_ptr<CommandBase> createRootCommand() override;
 };

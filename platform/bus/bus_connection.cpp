@@ -1,12 +1,11 @@
 #include "platform/bus/bus_connection.h"
 
-#include "platform/portable/thread_name.h"
+#include "platform/threads.h"
 
 #include <poll.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <system_error>
 #include <utility>
 
 namespace {
@@ -43,12 +42,7 @@ BusConnection::BusConnection(const std::string& threadName, Hooks connectionHook
     : hooks(std::move(connectionHooks)) {
   // The thread takes the lock before anything else, and so finds `thread` set.
   const std::lock_guard lock(mutex);
-  try {
-    thread = std::thread([this] { run(); });
-    nameThread(thread, threadName);
-  } catch (const std::system_error&) {
-    // Without a thread this is a connection to no bus, for good.
-  }
+  thread = startThread(threadName, [this] { run(); });
 }
 
 BusConnection::~BusConnection() {
@@ -57,9 +51,7 @@ BusConnection::~BusConnection() {
     stopping = true;
   }
   wakeUp.signal();
-  if (thread.joinable()) {
-    thread.join();
-  }
+  thread.join();
 }
 
 void BusConnection::call(BusCall call, ReplyHandler handler) {
@@ -69,8 +61,7 @@ void BusConnection::call(BusCall call, ReplyHandler handler) {
 }
 
 void BusConnection::post(std::function<void()> task) {
-  const auto self = std::this_thread::get_id();
-  if (self == thread.get_id() || !thread.joinable()) {
+  if (std::this_thread::get_id() == thread.get_id()) {
     task();
     return;
   }
@@ -170,7 +161,7 @@ void BusConnection::drop() {
 
 /// Sends a call now, or once the bus has greeted. Without a bus, answers it at once.
 void BusConnection::startCall(BusCall call, ReplyHandler handler) {
-  if (!bus && thread.joinable()) {
+  if (!bus) {
     connect();
   }
   if (ready) {

@@ -3,13 +3,11 @@
 #include "platform/journal/batch_queue.h"
 #include "platform/journal/entry_decoder.h"
 #include "platform/journal/journal_reader.h"
+#include "platform/threads.h"
 
 #include <atomic>
-#include <csignal>
 #include <cstring>
 #include <exception>
-#include <future>
-#include <system_error>
 #include <thread>
 #include <utility>
 
@@ -30,17 +28,6 @@ namespace {
 
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
-
-/// Leaves the process's signals to the threads that expect them; a pipe that breaks under a write
-/// on this thread shows as an error then. Threads started from here on do the same.
-void blockSignals() {
-  sigset_t blocked{};
-  sigfillset(&blocked);
-  for (const int fault : {SIGBUS, SIGFPE, SIGILL, SIGSEGV}) {
-    sigdelset(&blocked, fault);
-  }
-  pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
-}
 
 /// The reading thread: puts the selected entries into `queue`. Returns whether nothing is missing.
 bool readAll(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& queue) {
@@ -96,11 +83,7 @@ class LogReader::Session {
 
 void LogReader::Session::start(const std::shared_ptr<Session>& self, LogTime from) {
   position = from;
-  try {
-    delivering = std::thread([self, from] { self->run(from); });
-  } catch (const std::system_error&) {
-    end(kLogReaderReadError);
-  }
+  delivering = startThread("log.deliver", [self, from] { self->run(from); });
 }
 
 void LogReader::Session::stop() {
@@ -120,7 +103,6 @@ void LogReader::Session::release() {
 }
 
 void LogReader::Session::run(LogTime from) {
-  blockSignals();
   const auto reason = flags == kSupportedFlags ? deliverAll(from) : kLogReaderUnsupported;
   if (!stopped) {
     end(reason);
@@ -136,14 +118,11 @@ void LogReader::Session::end(unsigned long reason) {
 
 /// Reads and delivers everything, or until the reader is stopped. Returns the reason of the end.
 unsigned long LogReader::Session::deliverAll(LogTime from) {
-  try {
-    auto reading = std::async(std::launch::async, [&] { return readAll(filter, from, queue); });
-    const bool delivered = deliverQueued();
-    return reading.get() && delivered ? kLogReaderAtEnd : kLogReaderReadError;
-  } catch (const std::exception&) {
-    // No thread can be had.
-    return kLogReaderReadError;
-  }
+  bool complete = false;
+  auto reading = startThread("log.read", [&] { complete = readAll(filter, from, queue); });
+  const bool delivered = deliverQueued();
+  reading.join();
+  return complete && delivered ? kLogReaderAtEnd : kLogReaderReadError;
 }
 
 /// Delivers until the queue ends. False when no memory is left.

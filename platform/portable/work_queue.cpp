@@ -1,12 +1,11 @@
 #include "platform/work_queue.h"
 
-#include "platform/portable/thread_name.h"
+#include "platform/threads.h"
 
 #include <condition_variable>
 #include <deque>
 #include <mutex>
 #include <optional>
-#include <system_error>
 #include <thread>
 #include <utility>
 
@@ -44,9 +43,8 @@ void runUntilClosed(const std::shared_ptr<Backlog>& backlog) {
 class WorkQueue::Worker {
  public:
   explicit Worker(std::string queueLabel)
-      : label(std::move(queueLabel)), thread(runUntilClosed, backlog) {
-    nameThread(thread, label);
-  }
+      : label(std::move(queueLabel)),
+        thread(startThread(label, [shared = backlog] { runUntilClosed(shared); })) {}
 
   Worker(const Worker&) = delete;
   Worker& operator=(const Worker&) = delete;
@@ -73,11 +71,7 @@ class WorkQueue::Worker {
 
 WorkQueue WorkQueue::create(std::string label) {
   WorkQueue queue;
-  try {
-    queue.worker = std::make_shared<Worker>(std::move(label));
-  } catch (const std::system_error&) {
-    // The handle stays absent, which is how the caller learns of it.
-  }
+  queue.worker = std::make_shared<Worker>(std::move(label));
   return queue;
 }
 

@@ -57,7 +57,8 @@ void handleSignal(int number) {
 
 bool watchTerminal() {
   reader = pthread_self();
-  if (tcgetattr(STDIN_FILENO, &found) != 0 || std::atexit(restoreTerminal) != 0) {
+  if (tcgetattr(STDIN_FILENO, &found) != 0 || std::atexit(restoreTerminal) != 0 ||
+      std::at_quick_exit(restoreTerminal) != 0) {
     return false;
   }
   wakeUp = new WakeUp;

@@ -15,8 +15,7 @@ TEST(StartUp, FailsWhenItsShellThreadCannotStart) {
   // A stack that no address space has room for.
   EXPECT_EQ(SimulatedDevice("RADIO_TYPE=1").runLine("ulimit -s 200000000000; exec \"$0\" help"),
             (ProcessResult{1, "",
-                           "velltool: cannot start the shell thread: Resource temporarily "
-                           "unavailable\n"}));
+                           "velltool: cannot start a thread: Resource temporarily unavailable\n"}));
 }
 
 TEST(Output, HasEachLineOutBeforeTheNextIsBegun) {

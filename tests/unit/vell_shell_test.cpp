@@ -8,7 +8,6 @@
 #include "tool/server_state.h"
 
 #include <gtest/gtest.h>
-#include <pthread.h>
 
 TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
   in_process::device.programName = "mytool";
@@ -35,19 +34,6 @@ TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
     in_process::device.eventHandler(payload, {});
     EXPECT_FALSE(IsServerRunning()) << other;
   }
-}
-
-TEST(VellShell, FailsWhenItsWorkQueueCannotBeStarted) {
-#ifdef VELL_SANITIZED
-  GTEST_SKIP() << "A sanitizer gives threads stacks of its own choice.";
-#endif
-  pthread_attr_t usual{};
-  pthread_getattr_default_np(&usual);
-  pthread_attr_t boundless = usual;
-  ASSERT_EQ(pthread_attr_setstacksize(&boundless, std::size_t{1} << 47U), 0);
-  pthread_setattr_default_np(&boundless);
-  EXPECT_FALSE(VellShell().run({"t", "help"}));
-  pthread_setattr_default_np(&usual);
 }
 
 TEST(OsLogContext, IsTheSameOnEveryCall) {

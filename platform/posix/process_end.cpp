@@ -1,0 +1,23 @@
+#include "platform/process_end.h"
+
+#include "platform/posix/whole_write.h"
+
+#include <unistd.h>
+
+#include <array>
+#include <atomic>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+void endProcess(const char* what, int error) {
+  static std::atomic_flag ending = ATOMIC_FLAG_INIT;
+  while (ending.test_and_set()) {
+    pause();  // Another thread ends the process.
+  }
+  std::array<char, 256> line{};
+  std::snprintf(line.data(), line.size(), "velltool: %s%s%s\n", what, error == 0 ? "" : ": ",
+                error == 0 ? "" : std::strerror(error));
+  static_cast<void>(writeWhole(STDERR_FILENO, line.data()));
+  std::quick_exit(EXIT_FAILURE);
+}

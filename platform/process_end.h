@@ -1,0 +1,7 @@
+#pragma once
+
+/// Ends the process with status 1, for want of something that it cannot go on without. Writes
+/// "velltool: ", `what` and, unless it is 0, what the errno `error` means as one line to standard
+/// error, and sets the terminal as it was found. Nothing else is written: no stream is flushed and
+/// nothing is destroyed, see std::quick_exit. Needs no memory.
+[[noreturn]] void endProcess(const char* what, int error = 0);
