@@ -2,6 +2,7 @@
 
 #include "simulator/child_process.h"
 #include "simulator/complaint.h"
+#include "simulator/device_root.h"
 
 #include <fstream>
 #include <system_error>
@@ -31,7 +32,7 @@ bool packDirectories(const fs::path& parent, const Collection& collection,
   std::vector<std::string> words = {"tar",
                                     "--create",
                                     "--force-local",
-                                    collection.gzip ? "--gzip" : "--no-auto-compress",
+                                    "--auto-compress",
                                     "--file=" + archive.string(),
                                     "--directory=" + parent.string()};
   words.insert(words.end(), collection.directories.begin(), collection.directories.end());

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "simulator/device_model.h"
+#include "simulator/answer.h"
 
 #include <filesystem>
 #include <string>

@@ -3,6 +3,7 @@
 #include "simulator/child_process.h"
 #include "simulator/complaint.h"
 #include "simulator/device_root.h"
+#include "simulator/profile.h"
 #include "simulator/service.h"
 
 #include <fcntl.h>
@@ -101,19 +102,19 @@ Device::~Device() {
   }
 }
 
-bool Device::start(const DeviceModel& model) {
+bool Device::start(const Profile& profile) {
   if (!managerControl) {
     complain("cannot open the manager's control pipe");
     return false;
   }
-  if (model.journalRuns() && !startService("journal")) {
+  if (profile.journal && !startService("journal")) {
     return false;
   }
-  if (!model.busRuns()) {
+  if (!profile.bus) {
     return true;
   }
-  return startService("bus") && (!model.managerRuns() || startService("manager")) &&
-         (!model.helperRuns() || startService("helper"));
+  return startService("bus") && (!profile.manager || startService("manager")) &&
+         (!profile.helper || startService("helper"));
 }
 
 bool Device::startService(const std::string& name) {

@@ -12,7 +12,7 @@
 namespace simulator {
 
 class DeviceRoot;
-class DeviceModel;
+struct Profile;
 
 /// The processes of one simulated device: its bus and its services, as children of this process,
 /// and the command that runs in it, with whatever that starts. Uses waitpid(2) for any child, and
@@ -26,9 +26,9 @@ class Device {
   Device& operator=(const Device&) = delete;
   ~Device();
 
-  /// Starts what runs on the device that `model` describes and waits until it can be reached.
+  /// Starts what runs on the device that `profile` describes and waits until it can be reached.
   /// Complains and returns false when something cannot be started.
-  bool start(const DeviceModel& model);
+  bool start(const Profile& profile);
 
   /// Runs `command` in the device and returns its exit status, 128 and the signal when one ended
   /// it. A signal to end that this process gets meanwhile goes to the command and all that descends

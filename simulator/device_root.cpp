@@ -7,6 +7,8 @@
 #include <cerrno>
 #include <cstdlib>
 #include <fstream>
+#include <iomanip>
+#include <sstream>
 #include <string_view>
 #include <system_error>
 
@@ -15,6 +17,12 @@ namespace simulator {
 namespace {
 
 namespace fs = std::filesystem;
+
+/// Where the live traces are.
+constexpr const char* kScratchDirectories[] = {
+    "private/var/wireless/Library/Logs/VellManager/DIAG.scratch",
+    "private/var/wireless/Library/Logs/VellManager/QDSS.scratch",
+};
 
 /// Throws std::system_error.
 void writeFile(const fs::path& path, const std::string& text) {
@@ -62,18 +70,15 @@ std::string busConfiguration(const std::string& address) {
          "</busconfig>\n";
 }
 
-/// The settings in the syntax that the settings files of the device have.
-std::string settingsText(const std::map<std::string, std::string>& settings) {
-  std::string text;
-  for (const auto& [key, value] : settings) {
-    text += key + "=\"";
-    for (const char character : value) {
-      text += character == '"' || character == '\\' ? std::string{'\\', character}
-                                                    : std::string{character};
+/// The trace properties that are texts, as a settings file.
+std::string savedTraces(const Profile& profile) {
+  std::ostringstream text;
+  for (const auto& [name, payload] : profile.traces) {
+    if (const auto* const value = textIn(payload)) {
+      text << name << '=' << std::quoted(*value) << '\n';
     }
-    text += "\"\n";
   }
-  return text;
+  return text.str();
 }
 
 /// Writes the process table; see proc(5).
@@ -125,9 +130,9 @@ std::string DeviceRoot::busAddress() const {
 void DeviceRoot::fill(const Profile& profile) const {
   writeFile(root / kDeviceProfile, profile.text);
   writeFile(root / kBusConfiguration, busConfiguration(busAddress()));
-  writeProcesses(root / "proc", profile.model.processes());
-  if (const auto traces = profile.model.savedTraces()) {
-    writeFile(root / kSavedTraces, settingsText(*traces));
+  writeProcesses(root / "proc", profile.processes);
+  if (profile.savedTraces) {
+    writeFile(root / kSavedTraces, savedTraces(profile));
   }
   fs::create_directories(root / kRequestLogDirectory);
   fs::create_directories(root / kSnapshotDirectory);

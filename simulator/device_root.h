@@ -12,6 +12,8 @@ namespace simulator {
 inline constexpr const char* kDeviceProfile = "etc/vell/device.conf";
 inline constexpr const char* kSavedTraces = "var/lib/vell/traces.conf";
 inline constexpr const char* kRequestLogDirectory = "var/log/vell-simulator";
+inline constexpr const char* kSnapshotDirectory =
+    "private/var/wireless/Library/Logs/Faultkeeper/Baseband";
 inline constexpr const char* kBusConfiguration = "run/bus.conf";
 inline constexpr const char* kBusSocket = "run/bus";
 inline constexpr const char* kManagerControl = "run/manager.control";

@@ -16,9 +16,9 @@ constexpr Service::Identity kHelperIdentity = {"org.vell.Helper1", "/org/vell/He
 
 }  // namespace
 
-HelperService::HelperService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
+HelperService::HelperService(Profile describedDevice, std::filesystem::path deviceRoot,
                              const RequestLog& log)
-    : device(std::move(describedDevice)), service(kHelperIdentity, std::move(deviceRoot), log) {}
+    : profile(std::move(describedDevice)), service(kHelperIdentity, std::move(deviceRoot), log) {}
 
 bool HelperService::connect() {
   static const sd_bus_vtable kVtable[] = {
@@ -40,7 +40,7 @@ int HelperService::perform(sd_bus_message* call, void* userdata, sd_bus_error* /
   }
   const auto line = "Perform " + std::to_string(task) + " " + command + " " + describe(request);
   helper.service.requestLog().write(line);
-  return helper.service.give(call, helper.device.performHelperCommand(command), line);
+  return helper.service.give(call, answerOfHelper(helper.profile, command, request), line);
 }
 
 }  // namespace simulator

@@ -7,8 +7,7 @@ namespace simulator {
 /// The manager's helper on the bus, `org.vell.Helper1`.
 class HelperService {
  public:
-  HelperService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
-                const RequestLog& log);
+  HelperService(Profile describedDevice, std::filesystem::path deviceRoot, const RequestLog& log);
 
   /// Connects and owns the name; see `Service::connect`.
   bool connect();
@@ -19,7 +18,7 @@ class HelperService {
  private:
   static int perform(sd_bus_message* call, void* userdata, sd_bus_error* error);
 
-  const DeviceModel device;
+  const Profile profile;
   Service service;
 };
 

@@ -36,8 +36,7 @@ void redirectErrors(const std::string& log) {
 }
 
 /// Becomes the daemon, which prints its address on standard output once it can be reached.
-int serveBus(const std::string& log) {
-  redirectErrors(log);
+int serveBus() {
   const auto configuration = "--config-file=" + (sysroot() / simulator::kBusConfiguration).string();
   // A socket that an earlier daemon left behind would be in the way.
   unlink((sysroot() / simulator::kBusSocket).c_str());
@@ -47,8 +46,7 @@ int serveBus(const std::string& log) {
   return EXIT_FAILURE;
 }
 
-int serveJournal(const std::string& log) {
-  redirectErrors(log);
+int serveJournal() {
   const auto now = std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
   const auto journal = simulator::Journal::create(sysroot(), simulator::lastHourOfDevice(now));
   if (!journal) {
@@ -59,9 +57,9 @@ int serveJournal(const std::string& log) {
 }
 
 template <typename NamedService>
-int serveNamed(const simulator::DeviceModel& device, const std::string& requestLog) {
+int serveNamed(const simulator::Profile& profile, const std::string& requestLog) {
   const simulator::RequestLog log(requestLog);
-  NamedService service(device, sysroot(), log);
+  NamedService service(profile, sysroot(), log);
   if (!service.connect()) {
     return EXIT_FAILURE;
   }
@@ -74,22 +72,21 @@ int serve(const simulator::Options& options) {
     complain("--serve works inside a simulated device only");
     return EXIT_FAILURE;
   }
+  redirectErrors(options.requestLog);
   std::ofstream(sysroot() / "run" / (options.service + ".pid")) << getpid() << "\n";
   if (options.service == "bus") {
-    return serveBus(options.requestLog);
+    return serveBus();
   }
   if (options.service == "journal") {
-    return serveJournal(options.requestLog);
+    return serveJournal();
   }
-  const auto path = sysroot() / simulator::kDeviceProfile;
-  const auto profile = SettingsFile::read(path).value_or(SettingsFile());
-  const auto device = simulator::describeDevice(profile, path);
-  if (!device) {
+  const auto profile = simulator::readProfile(sysroot() / simulator::kDeviceProfile);
+  if (!profile) {
     return EXIT_FAILURE;
   }
   return options.service == "manager"
-             ? serveNamed<simulator::ManagerService>(*device, options.requestLog)
-             : serveNamed<simulator::HelperService>(*device, options.requestLog);
+             ? serveNamed<simulator::ManagerService>(*profile, options.requestLog)
+             : serveNamed<simulator::HelperService>(*profile, options.requestLog);
 }
 
 std::vector<std::string> usersShell() {
@@ -99,13 +96,13 @@ std::vector<std::string> usersShell() {
 
 int runDevice(const simulator::Options& options) {
   simulator::blockDeviceSignals();
-  const auto profile = simulator::loadProfile(options.profile);
+  const auto profile = simulator::readProfile(options.profile);
   const auto root = profile ? simulator::DeviceRoot::create(*profile) : nullptr;
   if (!root) {
     return EXIT_FAILURE;
   }
   simulator::Device device(*root);
-  if (!device.start(profile->model)) {
+  if (!device.start(*profile)) {
     return EXIT_FAILURE;
   }
   return device.run(options.command.empty() ? usersShell() : options.command);

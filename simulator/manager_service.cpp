@@ -23,16 +23,13 @@ constexpr Service::Identity kManagerIdentity = {"org.vell.Manager1", "/org/vell/
 
 }  // namespace
 
-ManagerService::ManagerService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
+ManagerService::ManagerService(Profile describedDevice, std::filesystem::path deviceRoot,
                                const RequestLog& log)
-    : device(std::move(describedDevice)), service(kManagerIdentity, std::move(deviceRoot), log) {}
+    : profile(std::move(describedDevice)), service(kManagerIdentity, std::move(deviceRoot), log) {}
 
 bool ManagerService::connect() {
   // A state that is to be no string is an integer on the bus, and says so when it is asked.
-  const auto payload = device.serverStatePayload();
-  const auto& entries = payload.entries();
-  const bool isString =
-      !entries.empty() && std::holds_alternative<std::string>(entries.front().value);
+  const bool isString = textIn(profile.serverState) != nullptr;
   static const sd_bus_vtable kStart[] = {SD_BUS_VTABLE_START(0)};
   static std::array<sd_bus_vtable, 6> vtable = {{
       kStart[0],
@@ -68,19 +65,17 @@ int ManagerService::performCommand(sd_bus_message* call, void* userdata, sd_bus_
   }
   const auto line = std::string("PerformCommand ") + command + " " + describe(request);
   manager.service.requestLog().write(line);
-  return manager.service.give(call, manager.device.performCommand(command, request), line);
+  return manager.service.give(call, answerOfManager(manager.profile, command, request), line);
 }
 
 int ManagerService::getServerState(sd_bus* /*bus*/, const char* /*path*/, const char* /*interface*/,
                                    const char* /*property*/, sd_bus_message* reply, void* userdata,
                                    sd_bus_error* /*error*/) {
   const auto& manager = *static_cast<ManagerService*>(userdata);
-  const auto payload = manager.device.serverStatePayload();
-  const auto state = payload.getString(vell::kKeyServerState);
   // The signature was settled at the start, and the type of the state does not change.
-  return sd_bus_message_append_basic(reply, SD_BUS_TYPE_STRING, state.c_str()) >= 0
-             ? 1
-             : sd_bus_message_append(reply, "x", std::int64_t{1});
+  const auto* const state = textIn(manager.profile.serverState);
+  return state != nullptr ? sd_bus_message_append(reply, "s", state->c_str())
+                          : sd_bus_message_append(reply, "x", std::int64_t{1});
 }
 
 bool ManagerService::takeControl() {
@@ -127,12 +122,14 @@ void ManagerService::obey(const std::string& line) {
   if (!known) {
     return complain("\"" + line + "\" is neither state STATE nor event NAME STATE");
   }
-  auto spoken = device;
-  spoken.setServerState(state);
-  if (word == "state") {
-    device = spoken;
+  auto payload = profile.serverState;
+  if (textIn(payload) != nullptr) {
+    payload.set(vell::kKeyServerState, state);
   }
-  sendEvent(name, spoken.serverStatePayload());
+  if (word == "state") {
+    profile.serverState = payload;
+  }
+  sendEvent(name, payload);
 }
 
 void ManagerService::sendEvent(const std::string& name, const MessageDict& payload) {

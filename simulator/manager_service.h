@@ -16,8 +16,7 @@ namespace simulator {
 /// Each is noted in the request log once the event is out.
 class ManagerService {
  public:
-  ManagerService(DeviceModel describedDevice, std::filesystem::path deviceRoot,
-                 const RequestLog& log);
+  ManagerService(Profile describedDevice, std::filesystem::path deviceRoot, const RequestLog& log);
 
   /// Connects and owns the name; see `Service::connect`.
   bool connect();
@@ -37,7 +36,7 @@ class ManagerService {
   void obey(const std::string& line);
   void sendEvent(const std::string& name, const MessageDict& payload);
 
-  DeviceModel device;
+  Profile profile;
   Service service;
   EventSourcePtr control;
   std::string unfinishedLine;

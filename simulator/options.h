@@ -10,7 +10,7 @@ namespace simulator {
 struct Options {
   std::string profile;               ///< Path of the profile; empty for the default device.
   std::vector<std::string> command;  ///< What to run in the device; empty for the user's shell.
-  std::string service;               ///< `bus`, `manager` or `helper`; empty for a whole device.
+  std::string service;               ///< `bus`, `manager`, `helper` or `journal`; empty: a device.
   std::string requestLog;            ///< Where the service writes its requests; empty: to stdout.
 };
 

@@ -2,7 +2,7 @@
 
 #include "platform/bus/bus_handles.h"
 #include "platform/portable/handle.h"
-#include "simulator/device_model.h"
+#include "simulator/answer.h"
 #include "simulator/request_log.h"
 
 #include <systemd/sd-bus.h>
