@@ -9,6 +9,7 @@
 #include <iomanip>
 #include <map>
 #include <sstream>
+#include <thread>
 #include <utility>
 
 namespace simulator {
@@ -17,8 +18,9 @@ namespace {
 
 constexpr std::int32_t kStatusBadRequest = static_cast<std::int32_t>(0xE020E003U);
 
-/// A payload that names a collection by the present time.
+/// A payload that names a collection by the present time, which no other call has returned.
 MessageDict presentTime(const std::string& key) {
+  std::this_thread::sleep_for(std::chrono::milliseconds(1));
   const auto now = std::chrono::system_clock::now();
   const auto seconds = std::chrono::system_clock::to_time_t(now);
   std::tm parts{};
