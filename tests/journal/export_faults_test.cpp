@@ -84,8 +84,12 @@ TEST(ExportFailures, LeaveWhatCanBeReadOfADamagedJournal) {
       std::ofstream(file) << std::string(stored).replace(place, bytes.size(), bytes);
       return device.run();
     };
-    // The times of its first and last entry, as the header has them.
-    EXPECT_EQ(linesOf(runDamaged(184, std::string(16, '\0'))), linesOf(whole));
+    // The times of its first and last entry, as the header has them. The library of Debian 12 (252)
+    // makes no use of them, that of Debian 13 (257) does not open a file without them.
+    const auto unopened =
+        "Could not open: No data available\nFailed to prepare oslog stream\nstatus 1\n";
+    EXPECT_EQ(linesOf(runDamaged(184, std::string(16, '\0'))),
+              JOURNAL_VERSION < 257 ? linesOf(whole) : unopened);
     const auto end = stored.size() / 8 * 5;
     for (const auto byte : {'\0', '\xA7'}) {
       const auto part = runDamaged(end, std::string(stored.size() - end, byte));
