@@ -97,7 +97,10 @@ std::vector<std::string> usersShell() {
 int runDevice(const simulator::Options& options) {
   simulator::blockDeviceSignals();
   const auto profile = simulator::readProfile(options.profile);
-  const auto root = profile ? simulator::DeviceRoot::create(*profile) : nullptr;
+  if (!profile) {
+    return EXIT_FAILURE;
+  }
+  const auto root = simulator::DeviceRoot::create(*profile);
   if (!root) {
     return EXIT_FAILURE;
   }

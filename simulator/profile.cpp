@@ -30,7 +30,7 @@ constexpr const char* kFaultWords =
 
 /// Complains and returns false when the file at `path` cannot be read.
 bool readText(const std::string& path, std::string& text) {
-  std::ifstream stream(path, std::ios::binary);
+  const std::ifstream stream(path, std::ios::binary);
   std::ostringstream content;
   errno = stream ? 0 : errno;
   // A folder opens like a file and fails only when it is read.

@@ -105,7 +105,7 @@ std::optional<SettingsFile> SettingsFile::read(const std::filesystem::path& path
   if (std::filesystem::exists(status) && !std::filesystem::is_regular_file(status)) {
     return unreadable("not a file");
   }
-  std::ifstream stream(path, std::ios::binary);
+  const std::ifstream stream(path, std::ios::binary);
   if (!stream) {
     return unreadable(std::strerror(errno));
   }

@@ -67,7 +67,7 @@ void JournalFileIterator::start(const LogSelection& selection) {
   }
   // By its header. What is added meanwhile is newer.
   const auto last = timeOfLast(journal.get());
-  damaged = file.isLive && !(fixEnd() && last <= end.realtime);
+  damaged = file.isLive && (!fixEnd() || last > end.realtime);
   const auto answer = askIndex(selection);
   if (answer == Answer::Damaged) {
     goOnWithoutIndex(0);

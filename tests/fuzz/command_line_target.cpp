@@ -129,7 +129,7 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   auto arguments = CommandShell::convertCmdArgsToList(-1, nullptr);
   if (!typed) {
     arguments.assign(words.begin(), words.end());
-    arguments.push_front("t");
+    arguments.emplace_front("t");
   }
 
   const auto output = [&](auto run) {
