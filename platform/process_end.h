@@ -5,3 +5,13 @@
 /// error, and sets the terminal as it was found. Nothing else is written: no stream is flushed and
 /// nothing is destroyed, see std::quick_exit. Needs no memory.
 [[noreturn]] void endProcess(const char* what, int error = 0);
+
+/// Ends the process if the errno `error` says that memory or file descriptors have run out.
+void endIfScarce(int error);
+
+/// What a library returned, a negative errno after a failure; ends the process as `endIfScarce`
+/// does. Such a failure tells nothing of what was asked.
+inline int unlessScarce(int result) {
+  endIfScarce(-result);
+  return result;
+}

@@ -15,7 +15,8 @@ class WorkGroup {
   /// An absent group.
   WorkGroup() = default;
 
-  /// A new group with nothing outstanding; an absent one when there is no memory for it.
+  /// A new group with nothing outstanding; an absent one when the platform has none to give. The
+  /// one that ships always has.
   static WorkGroup create();
 
   /// Whether this handle has a counter.

@@ -1,4 +1,5 @@
 #include "framework/command_shell.h"
+#include "platform/process_end.h"
 #include "platform/program.h"
 #include "platform/telephony.h"
 #include "platform/threads.h"
@@ -9,6 +10,7 @@
 #include <iostream>
 #include <list>
 #include <memory>
+#include <new>
 #include <string>
 
 namespace {
@@ -39,6 +41,7 @@ void runShellThread(const std::list<std::string>& words, const sigset_t& blocked
 }  // namespace
 
 int main(int count, char* vector[]) {
+  std::set_new_handler([] { endProcess("out of memory"); });
   prepareStandardStreams();
   const auto words = CommandShell::convertCmdArgsToList(count, vector);
   if (radioType() == 0) {

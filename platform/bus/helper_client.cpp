@@ -4,6 +4,7 @@
 #include "platform/bus/bus_connection.h"
 #include "platform/bus/bus_dictionary.h"
 #include "platform/helper_names.h"
+#include "platform/process_end.h"
 
 #include <algorithm>
 #include <chrono>
@@ -53,8 +54,8 @@ CommandResult vell::HelperClient::perform(helper::TaskID task, const char* comma
       {kHelperBusName, kHelperPath, kHelperInterface, "Perform",
        [task, command = std::string(command),
         request = std::move(request)](sd_bus_message* message) {
-         return sd_bus_message_append(message, "u", task) >= 0 && appendText(message, command) &&
-                appendDictionary(message, request);
+         return unlessScarce(sd_bus_message_append(message, "u", task)) >= 0 &&
+                appendText(message, command) && appendDictionary(message, request);
        }},
       [promise](BusOutcome outcome, sd_bus_message* answer) {
         promise->set_value(outcome == BusOutcome::answered

@@ -5,6 +5,7 @@
 #include "platform/bus/bus_dictionary.h"
 #include "platform/device/saved_traces.h"
 #include "platform/manager_names.h"
+#include "platform/process_end.h"
 
 #include <future>
 #include <map>
@@ -177,8 +178,8 @@ class vell::client::Manager {
 
   void onConnected(sd_bus* bus) {
     sd_bus_slot* slot = nullptr;
-    if (sd_bus_match_signal_async(bus, &slot, kBusName, kObjectPath, kInterface, "Event", onEvent,
-                                  nullptr, this) >= 0) {
+    if (unlessScarce(sd_bus_match_signal_async(bus, &slot, kBusName, kObjectPath, kInterface,
+                                               "Event", onEvent, nullptr, this)) >= 0) {
       events.reset(slot);
     }
     const std::string ownerRule =
@@ -186,7 +187,8 @@ class vell::client::Manager {
             "type='signal',sender='org.freedesktop.DBus',interface='org.freedesktop.DBus',"
             "member='NameOwnerChanged',arg0='") +
         kBusName + "'";
-    if (sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr, this) >= 0) {
+    if (unlessScarce(sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr,
+                                            this)) >= 0) {
       ownerChanges.reset(slot);
     }
     askForOwner();
@@ -205,17 +207,17 @@ class vell::client::Manager {
 
   /// The bus answers in order: a change of owner that is told before the answer is older than it.
   void askForOwner() {
-    connection.call(
-        {kBusDaemon, "/org/freedesktop/DBus", kBusDaemon, "GetNameOwner",
-         [](sd_bus_message* message) {
-           return sd_bus_message_append(message, "s", kBusName) >= 0;
-         }},
-        [this](BusOutcome outcome, sd_bus_message* reply) {
-          const char* name = nullptr;
-          if (outcome == BusOutcome::answered && sd_bus_message_read(reply, "s", &name) > 0) {
-            owner = name;
-          }
-        });
+    connection.call({kBusDaemon, "/org/freedesktop/DBus", kBusDaemon, "GetNameOwner",
+                     [](sd_bus_message* message) {
+                       return unlessScarce(sd_bus_message_append(message, "s", kBusName)) >= 0;
+                     }},
+                    [this](BusOutcome outcome, sd_bus_message* reply) {
+                      const char* name = nullptr;
+                      if (outcome == BusOutcome::answered &&
+                          unlessScarce(sd_bus_message_read(reply, "s", &name)) > 0) {
+                        owner = name;
+                      }
+                    });
   }
 
   void openClient() {
@@ -232,8 +234,8 @@ class vell::client::Manager {
     }
     connection.call(managerCall("org.freedesktop.DBus.Properties", "Get",
                                 [](sd_bus_message* message) {
-                                  return sd_bus_message_append(message, "ss", kInterface,
-                                                               "ServerState") >= 0;
+                                  return unlessScarce(sd_bus_message_append(
+                                             message, "ss", kInterface, "ServerState")) >= 0;
                                 }),
                     [this](BusOutcome outcome, sd_bus_message* reply) {
                       // A former owner may be late; the state of the new one, or of none, is told
@@ -255,7 +257,7 @@ class vell::client::Manager {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* name = nullptr;
     if (!isFrom(signal, manager.owner) || sd_bus_message_has_signature(signal, "sv") <= 0 ||
-        sd_bus_message_read(signal, "s", &name) <= 0) {
+        unlessScarce(sd_bus_message_read(signal, "s", &name)) <= 0) {
       return 0;
     }
     const auto tell = manager.subscriptions.listener(name);
@@ -270,7 +272,7 @@ class vell::client::Manager {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* newOwner = nullptr;
     if (!isFrom(signal, kBusDaemon) ||
-        sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner) <= 0) {
+        unlessScarce(sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner)) <= 0) {
       return 0;
     }
     manager.owner = newOwner;

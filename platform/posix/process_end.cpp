@@ -6,6 +6,7 @@
 
 #include <array>
 #include <atomic>
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -20,4 +21,13 @@ void endProcess(const char* what, int error) {
                 error == 0 ? "" : std::strerror(error));
   static_cast<void>(writeWhole(STDERR_FILENO, line.data()));
   std::quick_exit(EXIT_FAILURE);
+}
+
+void endIfScarce(int error) {
+  if (error == ENOMEM) {
+    endProcess("out of memory");
+  }
+  if (error == EMFILE || error == ENFILE) {
+    endProcess("cannot open a file", error);
+  }
 }
