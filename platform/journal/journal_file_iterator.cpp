@@ -22,9 +22,9 @@
 //   - in a live file: the entry that the header names as last is not newer than the one found;
 //   - in any other: the last entry has the time that the header names;
 //   - always: the library still has the file.
-// That a page of any file was lost is seen at the end of the export.
+// That a page was lost is asked after each step.
 // If an index fails the check, its file is opened again and walked plainly behind the entry that
-// was reached. Whatever fails, `damaged` says that entries may be missing.
+// was reached. Whatever fails, the file's status says that entries may be missing, and why.
 //
 // Cost. A plain step is one entry of an array that the library has mapped. A step by the index
 // costs 0.3 of that more for each match. A cursor costs as much as reading an entry, so it is asked
@@ -33,12 +33,17 @@
 #include "platform/journal/journal_file_iterator.h"
 
 #include "platform/journal/lost_pages.h"
+#include "platform/process_end.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <string_view>
 #include <utility>
 
 namespace {
+
+constexpr const char* kWhole = "";
+constexpr const char* kEndsEarly = "ends before its last entry";
 
 void addItem(std::string_view item, EntryBatch& batch) {
   const auto equals = item.find('=');
@@ -62,20 +67,23 @@ JournalFileIterator::JournalFileIterator(JournalFile journalFile, std::uint64_t 
 
 void JournalFileIterator::start(const LogSelection& selection) {
   if (!open()) {
-    close(false);
+    close(whyNotOpened(errno, file.file).c_str());
     return;
   }
   // By its header. What is added meanwhile is newer.
   const auto last = timeOfLast(journal.get());
-  damaged = file.isLive && (!fixEnd() || last > end.realtime);
+  if (file.isLive && (!fixEnd() || last > end.realtime)) {
+    note(kEndsEarly);
+  }
   const auto answer = askIndex(selection);
   if (answer == Answer::Damaged) {
     goOnWithoutIndex(0);
   } else if (answer == Answer::NoneSelected || (!end.cursor.empty() && end.realtime < earliest)) {
-    close(true);
+    close(kWhole);
   } else if (!goToFirst()) {
-    close(timeOfLast(journal.get()) < earliest);
+    close(timeOfLast(journal.get()) < earliest ? kWhole : kEndsEarly);
   }
+  lostPage();
 }
 
 /// Opens the journal, or opens it again.
@@ -98,7 +106,7 @@ bool JournalFileIterator::fixEnd() {
 /// closed in good order may lack entries. What damaged the end of a file may have damaged its
 /// index.
 JournalFileIterator::Answer JournalFileIterator::askIndex(const LogSelection& selection) {
-  const bool trusted = file.wasClosed && !damaged && !selection.isEverything();
+  const bool trusted = file.wasClosed && file.status.isWhole() && !selection.isEverything();
   auto matches = trusted ? findIndexMatches(journal.get(), selection) : std::nullopt;
   if (!hasJournalFile(journal.get())) {
     return Answer::Damaged;
@@ -119,40 +127,42 @@ JournalFileIterator::Answer JournalFileIterator::askIndex(const LogSelection& se
 
 bool JournalFileIterator::read(EntryBatch& batch) {
   batch.begin(current);
-  const auto lost = lostPages();
   const void* data = nullptr;
   std::size_t length = 0;
+  const auto next = [&] {
+    return unlessScarce(sd_journal_enumerate_data(journal.get(), &data, &length));
+  };
   sd_journal_restart_data(journal.get());
-  int more = sd_journal_enumerate_data(journal.get(), &data, &length);
-  for (; more > 0; more = sd_journal_enumerate_data(journal.get(), &data, &length)) {
+  int more = next();
+  for (; more > 0; more = next()) {
     addItem({static_cast<const char*>(data), length}, batch);
   }
-  const bool whole = more == 0 && lostPages() == lost;
+  const bool whole = !lostPage() && more == 0;
   if (!whole) {
     batch.dropLast();
-    damaged = true;
+    note("has a damaged entry");
   }
   return whole;
 }
 
 void JournalFileIterator::advance(bool selected) {
-  const auto lost = lostPages();
   const auto left = current;
   if (state == State::AtEnd) {
     if (!index.isUsed() || isEndOfIndex()) {
-      close(true);
+      close(kWhole);
       return;
     }
   } else {
     index.chooseNextStep(journal.get(), selected);
-    if (goToNext() && lostPages() == lost) {
+    const bool found = goToNext();
+    if (!lostPage() && found) {
       return;
     }
   }
   if (index.isUsed()) {
     goOnWithoutIndex(left);
   } else {
-    close(isEndOfFile());
+    close(isEndOfFile() ? kWhole : kEndsEarly);
   }
 }
 
@@ -174,13 +184,13 @@ bool JournalFileIterator::goToFirst() {
 }
 
 bool JournalFileIterator::goToNext() {
-  if (sd_journal_next(journal.get()) <= 0 ||
+  if (unlessScarce(sd_journal_next(journal.get())) <= 0 ||
       sd_journal_get_realtime_usec(journal.get(), &current) < 0) {
     return false;
   }
   latest = std::max(latest, current);
-  const bool isLast =
-      current == end.realtime && sd_journal_test_cursor(journal.get(), end.cursor.c_str()) > 0;
+  const bool isLast = current == end.realtime &&
+                      unlessScarce(sd_journal_test_cursor(journal.get(), end.cursor.c_str())) > 0;
   state = isLast ? State::AtEnd : State::Walking;
   return true;
 }
@@ -189,7 +199,7 @@ bool JournalFileIterator::goToNext() {
 /// plainly to the first entry after the time `left`, from the start: seeking a time uses an index
 /// too.
 void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
-  damaged = true;
+  note("its index contradicts itself");
   index = JournalIndex();
   end = End();
   bool found = open() && (!file.isLive || fixEnd()) && goToFirst();
@@ -197,15 +207,33 @@ void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
     found = state == State::Walking && goToNext();
   }
   if (!found) {
-    close(false);
+    close(kEndsEarly);
   }
 }
 
-void JournalFileIterator::close(bool complete) {
-  damaged = damaged || !complete || !hasJournalFile(journal.get());
+void JournalFileIterator::close(const char* cause) {
+  note(cause);
+  if (!hasJournalFile(journal.get())) {
+    note(kEndsEarly);
+  }
   state = State::Closed;
   index = JournalIndex();
   end = End();
   journal.reset();
   file.file = FileDescriptor();
+}
+
+/// Notes why entries are or may be missing. That a page was lost explains whatever else is found.
+void JournalFileIterator::note(const char* cause) {
+  lostPage();
+  file.status.note(cause);
+}
+
+/// Whether a page of the file was lost since this was asked last; notes it.
+bool JournalFileIterator::lostPage() {
+  const bool lost = hasLostPage();
+  if (lost) {
+    file.status.note(kLostPage);
+  }
+  return lost;
 }

@@ -25,8 +25,8 @@ class JournalFileIterator {
   /// Fixes the end and goes to the first entry. Closes when there is none. To be called once.
   void start(const LogSelection& selection);
 
-  /// Whether entries are missing because they could not be read.
-  [[nodiscard]] bool isDamaged() const { return damaged; }
+  /// Says why entries are or may be missing, if they are.
+  [[nodiscard]] const FileStatus& status() const { return file.status; }
 
   /// Latest storage time seen so far, in microseconds; never falls, although the clock may have
   /// been set back. While waiting: a lower bound.
@@ -69,7 +69,9 @@ class JournalFileIterator {
   bool goToFirst();
   bool goToNext();
   void goOnWithoutIndex(std::uint64_t left);
-  void close(bool complete);
+  void close(const char* cause);
+  void note(const char* cause);
+  bool lostPage();
 
   JournalFile file;
   JournalPtr journal;
@@ -79,5 +81,4 @@ class JournalFileIterator {
   std::uint64_t latest;
   End end;
   JournalIndex index;
-  bool damaged = false;
 };

@@ -2,6 +2,7 @@
 
 #include "platform/device/sysroot.h"
 #include "platform/journal/lost_pages.h"
+#include "platform/process_end.h"
 
 #include <fcntl.h>
 #include <sys/resource.h>
@@ -9,7 +10,9 @@
 #include <systemd/sd-id128.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <set>
 #include <string_view>
@@ -18,21 +21,23 @@
 
 namespace {
 
-/// The contents of one folder, sorted. Empty when it cannot be read.
+/// The contents of one folder, sorted. Empty when it cannot be read, or is none.
 struct Folder {
+  FileStatus status;
   std::vector<std::filesystem::path> contents;
-  int error = 0;  ///< errno of the reading; 0 also when there is no such folder.
 
-  explicit Folder(const std::filesystem::path& path) {
+  explicit Folder(const std::filesystem::path& path) : status{path} {
     std::error_code failure;
     std::filesystem::directory_iterator entry(path, failure);
     for (; !failure && entry != std::filesystem::directory_iterator(); entry.increment(failure)) {
       contents.push_back(entry->path());
     }
     std::sort(contents.begin(), contents.end());
-    error = failure == std::errc::no_such_file_or_directory || failure == std::errc::not_a_directory
-                ? 0
-                : failure.value();
+    endIfScarce(failure.value());
+    if (failure && failure != std::errc::no_such_file_or_directory &&
+        failure != std::errc::not_a_directory) {
+      status.note(failure.message());
+    }
   }
 };
 
@@ -93,13 +98,10 @@ class Finder {
     const auto before = known.size();
     for (const auto* base : {"var/log/journal", "run/log/journal"}) {
       const Folder folder(sysroot() / base);
-      noteUnopened(folder.error);
       findFilesOf(folder);
       for (const auto& path : folder.contents) {
         if (isJournalFolder(path.filename())) {
-          const Folder machine(path);
-          noteUnopened(machine.error);
-          findFilesOf(machine);
+          findFilesOf(Folder(path));
         }
       }
     }
@@ -110,6 +112,7 @@ class Finder {
 
  private:
   void findFilesOf(const Folder& folder) {
+    noteStatus(folder.status);
     for (const auto& path : folder.contents) {
       if (isJournalFile(path.filename().native()) && files.found.size() < atMost) {
         findFile(path);
@@ -120,23 +123,26 @@ class Finder {
   void findFile(const std::filesystem::path& path) {
     FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     struct stat status {};
-    if (!file || fstat(file.get(), &status) != 0) {
-      noteUnopened(errno);
+    if (file ? fstat(file.get(), &status) != 0 : errno != ENOENT) {
+      noteStatus({path, whyNotOpened(errno, file)});
     } else if (S_ISREG(status.st_mode) && known.insert({status.st_dev, status.st_ino}).second) {
-      noteFile(path.filename().native(), std::move(file), status.st_size > 0);
+      noteFile({path}, path.filename().native(), std::move(file), status.st_size > 0);
       makeRoom();
     }
   }
 
-  void noteFile(std::string_view name, FileDescriptor opened, bool hasContent) {
+  void noteFile(FileStatus status, std::string_view name, FileDescriptor opened, bool hasContent) {
     const auto journal = openJournal(opened.duplicate());
+    // An empty file is one that is just being made.
+    if (!journal && hasContent) {
+      status.note(whyNotOpened(errno, opened));
+    }
     if (!journal) {
-      note(errno);
-      // An empty file is one that is just being made.
-      files.damaged = files.damaged || hasContent;
+      noteStatus(status);
       return;
     }
     JournalFile file;
+    file.status = std::move(status);
     file.file = std::move(opened);
     file.isLive = isLiveFile(name);
     file.wasClosed = !name.ends_with('~');
@@ -148,6 +154,9 @@ class Finder {
         sd_journal_seek_tail(journal.get());
         file.last = placeAfter(journal.get(), sd_journal_previous);
       }
+      if (hasLostPage()) {
+        file.status.note(kLostPage);
+      }
       files.found.push_back(std::move(file));
     }
   }
@@ -155,25 +164,19 @@ class Finder {
   /// Gives up the file that ends first when there are more than may be held open.
   void makeRoom() {
     if (files.found.size() > mostOpen) {
-      files.found.erase(std::min_element(files.found.begin(), files.found.end(),
-                                         [](const JournalFile& left, const JournalFile& right) {
-                                           return left.stored.last < right.stored.last;
-                                         }));
-      files.damaged = true;
+      const auto oldest = std::min_element(files.found.begin(), files.found.end(),
+                                           [](const JournalFile& left, const JournalFile& right) {
+                                             return left.stored.last < right.stored.last;
+                                           });
+      oldest->status.note(whyNotOpened(EMFILE, oldest->file));
+      noteStatus(oldest->status);
+      files.found.erase(oldest);
     }
   }
 
-  /// A file that is gone was rotated away; one that is forbidden is not the user's to read. Any
-  /// other error means that something is missing.
-  void noteUnopened(int error) {
-    note(error == ENOENT ? 0 : error);
-    files.damaged =
-        files.damaged || (error != 0 && error != ENOENT && error != EACCES && error != EPERM);
-  }
-
-  void note(int error) {
-    if (files.error == 0) {
-      files.error = error;
+  void noteStatus(const FileStatus& status) {
+    if (!status.isWhole()) {
+      files.missed.insert(status);
     }
   }
 
@@ -218,7 +221,7 @@ JournalPtr openJournal(FileDescriptor file) {
   surviveLostPages();
   sd_journal* opened = nullptr;
   int number = file.get();
-  const int result = sd_journal_open_files_fd(&opened, &number, 1, 0);
+  const int result = unlessScarce(sd_journal_open_files_fd(&opened, &number, 1, 0));
   if (result < 0) {
     errno = -result;
     return nullptr;
@@ -230,5 +233,30 @@ JournalPtr openJournal(FileDescriptor file) {
 
 bool hasJournalFile(sd_journal* journal) {
   std::uint64_t bytes = 0;
-  return sd_journal_get_usage(journal, &bytes) >= 0 && bytes > 0;
+  const bool has = sd_journal_get_usage(journal, &bytes) >= 0 && bytes > 0;
+  if (!has && errno == ENOMEM) {
+    endIfScarce(errno);  // For want of memory, it drops a file as if that were damaged.
+  }
+  return has;
+}
+
+std::string whyNotOpened(int error, const FileDescriptor& file) {
+  constexpr std::string_view kSignature = "LPKSHHRH";
+  switch (error) {
+    case EMFILE:
+    case ENFILE:
+      return "given up for want of file descriptors";
+    case EIDRM:
+      return "removed before its turn";
+    case EBADMSG:
+    case ENODATA: {
+      std::array<char, kSignature.size()> start{};
+      const auto length = pread(file.get(), start.data(), start.size(), 0);
+      return length > 0 && std::string_view(start.data(), start.size()) == kSignature
+                 ? "damaged at its head"
+                 : "not a journal";
+    }
+    default:
+      return std::strerror(error);
+  }
 }

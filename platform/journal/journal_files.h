@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/journal/file_status.h"
 #include "platform/journal/journal_place.h"
 #include "platform/portable/handle.h"
 #include "platform/posix/file_descriptor.h"
@@ -10,6 +11,8 @@
 #include <cstdint>
 #include <limits>
 #include <optional>
+#include <set>
+#include <string>
 #include <vector>
 
 /// Owns an open journal, which one thread opens, uses and closes, see sd-journal(3).
@@ -26,6 +29,7 @@ struct TimeSpan {
 /// One journal file. Held open, so that it is still found when it is renamed. The library opens no
 /// file that is removed.
 struct JournalFile {
+  FileStatus status;
   FileDescriptor file;
   bool isLive = false;     ///< Whether entries may still be added to it.
   bool wasClosed = false;  ///< Whether it was closed in good order, by its name.
@@ -42,8 +46,7 @@ struct JournalFile {
 /// many files there are.
 struct JournalFiles {
   std::vector<JournalFile> found;
-  int error = 0;         ///< errno of the first file that failed to open, else 0.
-  bool damaged = false;  ///< Whether a file is missing that exists and may be read.
+  std::set<FileStatus> missed;  ///< Files and folders that exist and are not read.
 };
 
 /// Finds the journal files below the sysroot, or the local machine's, as sd_journal_open(3) does:
@@ -59,6 +62,12 @@ JournalFiles findJournalFiles(std::uint64_t from,
 /// `file`. Survives lost pages of the file, see `surviveLostPages`. Used on the thread that closes
 /// the journal.
 JournalPtr openJournal(FileDescriptor file);
+
+/// Why a journal file, open as `file` unless that failed, could not be opened, by errno.
+std::string whyNotOpened(int error, const FileDescriptor& file);
+
+/// The cause for a file that somebody cut short meanwhile.
+inline constexpr const char* kLostPage = "lost a page";
 
 /// Whether the library still has the file of `journal`. It drops a file that it finds damaged, and
 /// goes on as if that had ended. False for null.

@@ -1,6 +1,7 @@
 #include "platform/journal/journal_place.h"
 
 #include "platform/portable/handle.h"
+#include "platform/process_end.h"
 
 #include <algorithm>
 #include <charconv>
@@ -21,7 +22,7 @@ bool readNumber(std::string_view cursor, char key, std::uint64_t& number) {
 
 std::string cursorOf(sd_journal* journal) {
   char* text = nullptr;
-  if (sd_journal_get_cursor(journal, &text) < 0) {
+  if (unlessScarce(sd_journal_get_cursor(journal, &text)) < 0) {
     return {};
   }
   const HandlePtr<char, std::free> owner(text);

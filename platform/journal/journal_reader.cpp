@@ -28,7 +28,7 @@ JournalReader::JournalReader(const std::optional<LogFilter>& filter, LogTime fro
       static_cast<std::uint64_t>(std::max<LogTime::rep>(from.time_since_epoch().count(), 1));
   raiseFileLimit();
   auto found = findJournalFiles(earliest);
-  complete = !found.damaged;
+  missedFiles = std::move(found.missed);
   for (auto& journalFile : found.found) {
     auto& file = files.emplace_back(std::move(journalFile), earliest);
     // The end of a live file is fixed now. Any other file is opened when its turn comes.
@@ -91,7 +91,9 @@ bool JournalReader::takeTurn() {
   while (const auto next = turns.next()) {
     auto& file = files[*next];
     if (file.isClosed()) {
-      complete = complete && !file.isDamaged();
+      if (!file.status().isWhole()) {
+        missedFiles.insert(file.status());
+      }
       turns.end();
     } else if (file.isWaiting()) {
       // Its first entry may turn out to be newer than it was taken for.

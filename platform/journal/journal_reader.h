@@ -5,10 +5,10 @@
 #include "platform/journal/entry_batch.h"
 #include "platform/journal/journal_file_iterator.h"
 #include "platform/journal/log_selection.h"
-#include "platform/journal/lost_pages.h"
 #include "platform/journal/turns.h"
 
 #include <optional>
+#include <set>
 #include <vector>
 
 /// Reads the selected entries of the device's journal files, from a point in time to what is stored
@@ -24,8 +24,8 @@ class JournalReader {
   /// some thousands, so that the caller hears of a stop. False when no entry is left.
   bool read(EntryBatch& batch);
 
-  /// Whether nothing is missing from what was read.
-  [[nodiscard]] bool isComplete() const { return complete && lostPages() == 0; }
+  /// Files and folders of which entries are or may be missing, when no entry is left.
+  [[nodiscard]] const std::set<FileStatus>& missed() const { return missedFiles; }
 
  private:
   bool readEntry(EntryBatch& batch);
@@ -40,5 +40,5 @@ class JournalReader {
   Turns turns;
   JournalFileIterator* current = nullptr;  ///< The file whose turn it is, if any.
   DuplicateFilter duplicates;
-  bool complete;
+  std::set<FileStatus> missedFiles;
 };

@@ -3,11 +3,11 @@
 #include "platform/journal/batch_queue.h"
 #include "platform/journal/entry_decoder.h"
 #include "platform/journal/journal_reader.h"
+#include "platform/system_log.h"
 #include "platform/threads.h"
 
 #include <atomic>
-#include <cstring>
-#include <exception>
+#include <set>
 #include <thread>
 #include <utility>
 
@@ -19,8 +19,8 @@ void LogStore::prepare(const Completion& completion) const {
   if (!files.found.empty()) {
     completion(std::make_shared<LogSource>(), std::nullopt);
   } else {
-    completion(nullptr, LogStoreError{files.error == 0 ? "No journal files were found"
-                                                       : std::strerror(files.error)});
+    completion(nullptr, LogStoreError{files.missed.empty() ? "No journal files were found"
+                                                           : files.missed.begin()->text()});
   }
 }
 
@@ -29,23 +29,19 @@ namespace {
 constexpr unsigned kSupportedFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
 
-/// The reading thread: puts the selected entries into `queue`. Returns whether nothing is missing.
-bool readAll(const std::optional<LogFilter>& filter, LogTime from, BatchQueue& queue) {
-  bool complete = false;
-  try {
-    JournalReader reader(filter, from);
-    EntryBatch batch;
-    bool more = true;
-    while (more) {
-      more = reader.read(batch);
-      more = queue.push(batch) && more;
-    }
-    complete = reader.isComplete();
-  } catch (const std::exception&) {
-    // No memory is left, and what is not queued by now is missing.
+/// The reading thread: puts the selected entries into `queue`. Returns the files of which entries
+/// are or may be missing.
+std::set<FileStatus> readAll(const std::optional<LogFilter>& filter, LogTime from,
+                             BatchQueue& queue) {
+  JournalReader reader(filter, from);
+  EntryBatch batch;
+  bool more = true;
+  while (more) {
+    more = reader.read(batch);
+    more = queue.push(batch) && more;
   }
   queue.finish();
-  return complete;
+  return reader.missed();
 }
 
 }  // namespace
@@ -69,7 +65,7 @@ class LogReader::Session {
  private:
   void run(LogTime from);
   unsigned long deliverAll(LogTime from);
-  bool deliverQueued();
+  void deliverQueued();
   void deliver(const JournalValues& values, std::uint64_t realtime);
   void end(unsigned long reason);
 
@@ -118,27 +114,23 @@ void LogReader::Session::end(unsigned long reason) {
 
 /// Reads and delivers everything, or until the reader is stopped. Returns the reason of the end.
 unsigned long LogReader::Session::deliverAll(LogTime from) {
-  bool complete = false;
-  auto reading = startThread("log.read", [&] { complete = readAll(filter, from, queue); });
-  const bool delivered = deliverQueued();
+  std::set<FileStatus> missed;
+  auto reading = startThread("log.read", [&] { missed = readAll(filter, from, queue); });
+  deliverQueued();
   reading.join();
-  return complete && delivered ? kLogReaderAtEnd : kLogReaderReadError;
+  for (const auto& file : missed) {
+    logSystemError(file.text());
+  }
+  return missed.empty() ? kLogReaderAtEnd : kLogReaderReadError;
 }
 
-/// Delivers until the queue ends. False when no memory is left.
-bool LogReader::Session::deliverQueued() {
-  try {
-    EntryBatch batch;
-    while (queue.pop(batch)) {
-      for (std::size_t entry = 0; entry < batch.size() && !stopped; ++entry) {
-        deliver(batch.valuesOf(entry), batch.realtimeOf(entry));
-      }
+/// Delivers until the queue ends.
+void LogReader::Session::deliverQueued() {
+  EntryBatch batch;
+  while (queue.pop(batch)) {
+    for (std::size_t entry = 0; entry < batch.size() && !stopped; ++entry) {
+      deliver(batch.valuesOf(entry), batch.realtimeOf(entry));
     }
-    return true;
-  } catch (const std::exception&) {
-    // The reading thread may be waiting for room.
-    queue.close();
-    return false;
   }
 }
 

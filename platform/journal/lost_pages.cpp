@@ -13,7 +13,7 @@ std::uintptr_t pageSize = 0;
 
 // Each thread has its own. A signal handler may touch these types on the thread that it interrupts.
 thread_local volatile std::sig_atomic_t survives = 0;
-thread_local volatile unsigned long lost = 0;
+thread_local volatile std::sig_atomic_t lost = 0;
 
 /// Maps a page of zeros over the lost page that holds `address`. False when mmap(2) fails.
 bool replacePage(void* address) {
@@ -24,7 +24,7 @@ bool replacePage(void* address) {
 
 void handleBusError(int number, siginfo_t* info, void* /*context*/) {
   if (survives != 0 && info->si_code == BUS_ADRERR && replacePage(info->si_addr)) {
-    lost = lost + 1;
+    lost = 1;
     return;
   }
   // Returning repeats the access, which now gets the former action. A sent signal has to be
@@ -51,6 +51,8 @@ void surviveLostPages() {
   survives = taken ? 1 : 0;
 }
 
-unsigned long lostPages() {
-  return lost;
+bool hasLostPage() {
+  const bool was = lost != 0;
+  lost = 0;
+  return was;
 }

@@ -6,6 +6,6 @@
 /// causes of the signal, get what they would have got without it.
 void surviveLostPages();
 
-/// How many pages this thread has lost so far. What was read while one was lost is not to be relied
-/// on.
-unsigned long lostPages();
+/// Whether this thread has lost a page since it asked last. What was read meanwhile is not to be
+/// relied on.
+bool hasLostPage();

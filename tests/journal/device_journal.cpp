@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 namespace fs = std::filesystem;
 
 simulator::JournalEntry message(long after, const std::string& text, Fields fields) {
@@ -63,7 +65,12 @@ TestProcess DeviceJournal::startExport(std::vector<std::string> selection,
 
 std::string DeviceJournal::finish(TestProcess& exporting) {
   auto [status, text, errors] = exporting.finish();
-  for (const auto& message : systemLog.messages()) {
+  const auto folder = (root() / kJournals.parent_path()).string() + "/";
+  for (auto message : systemLog.messages()) {
+    for (const auto& part : {folder, kJournals.filename().string() + "/"}) {
+      const auto at = message.find(part);
+      message.erase(std::min(at, message.size()), part.size());
+    }
     text += message + "\n";
   }
   return text + errors + (status == 0 ? "" : "status " + std::to_string(status) + "\n");

@@ -37,8 +37,10 @@ inline const std::string kStarted = "Getting oslog stream: history = 2147483647.
 /// The last word of it, see `lastWords`.
 inline const std::string kAll = "2147483647.000000 ";
 
-/// What it tells when something is missing besides.
-inline const std::string kIncomplete = kStarted + "Invalid oslog stream: reason = 1\n";
+/// What it tells when entries of a file are missing, with the cause.
+inline std::string incomplete(const std::string& damage) {
+  return kStarted + damage + "\nInvalid oslog stream: reason = 1\n";
+}
 
 /// A simulated device whose journals the test makes.
 class DeviceJournal : public SimulatedDevice {
