@@ -8,18 +8,13 @@
 
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 namespace simulator {
 
 namespace {
 
 constexpr int kStatusCannotRun = 127;
-
-void letSignalsThrough() {
-  sigset_t none;
-  sigemptyset(&none);
-  sigprocmask(SIG_SETMASK, &none, nullptr);
-}
 
 [[noreturn]] void becomeProgram(const std::vector<std::string>& words) {
   std::vector<char*> arguments;
@@ -33,18 +28,8 @@ void letSignalsThrough() {
   _exit(kStatusCannotRun);
 }
 
-}  // namespace
-
-pid_t startChild(const std::vector<std::string>& words, const ChildManners& manners, int input,
-                 int output) {
-  const pid_t parent = getpid();
-  const pid_t child = fork();
-  if (child < 0) {
-    complain("cannot start " + words.front() + ": " + std::strerror(errno));
-  }
-  if (child != 0) {
-    return child;
-  }
+/// Makes this process, a new child of `parent`, what `manners` say.
+void adopt(const ChildManners& manners, pid_t parent, int pipe) {
   prctl(PR_SET_PDEATHSIG, manners.signalAtParentsDeath);
   if (getppid() != parent) {
     _exit(kStatusCannotRun);
@@ -52,14 +37,37 @@ pid_t startChild(const std::vector<std::string>& words, const ChildManners& mann
   if (manners.isService) {
     setpgid(0, 0);
   }
-  if (input >= 0) {
-    dup2(input, STDIN_FILENO);
+  const std::pair<int, int> streams[] = {{manners.input, STDIN_FILENO},
+                                         {manners.output, STDOUT_FILENO},
+                                         {manners.piped < 0 ? -1 : pipe, manners.piped}};
+  for (const auto& [file, stream] : streams) {
+    if (file >= 0) {
+      dup2(file, stream);
+    }
   }
-  if (output >= 0) {
-    dup2(output, STDOUT_FILENO);
+  sigset_t none;
+  sigemptyset(&none);
+  sigprocmask(SIG_SETMASK, &none, nullptr);
+}
+
+}  // namespace
+
+Child startChild(const std::vector<std::string>& words, const ChildManners& manners) {
+  int ends[2] = {-1, -1};
+  const bool piped = manners.piped < 0 || pipe2(ends, O_CLOEXEC) == 0;
+  FileDescriptor readable(ends[0]);
+  FileDescriptor writable(ends[1]);
+  const bool childReads = manners.piped == STDIN_FILENO;
+  const pid_t parent = getpid();
+  const pid_t child = piped ? fork() : -1;
+  if (child < 0) {
+    complain("cannot start " + words.front() + ": " + std::strerror(errno));
   }
-  letSignalsThrough();
-  becomeProgram(words);
+  if (child == 0) {
+    adopt(manners, parent, childReads ? readable.get() : writable.get());
+    becomeProgram(words);
+  }
+  return {child, std::move(childReads ? writable : readable)};
 }
 
 int awaitChild(pid_t child) {

@@ -36,7 +36,7 @@ bool packDirectories(const fs::path& parent, const Collection& collection,
                                     "--file=" + archive.string(),
                                     "--directory=" + parent.string()};
   words.insert(words.end(), collection.directories.begin(), collection.directories.end());
-  const pid_t tar = startChild(words, {}, -1, -1);
+  const pid_t tar = startChild(words, {}).process;
   return tar > 0 && awaitChild(tar) == 0;
 }
 

@@ -12,7 +12,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
@@ -38,20 +37,11 @@ sigset_t deviceSignals() {
   return signals;
 }
 
-/// Waits for a whole line, which tells that a service can be reached.
-bool awaitLine(int file) {
-  std::array<char, 512> buffer{};
+/// Waits until a service says something, which it does once it can be reached.
+bool awaitFirstWord(int file) {
+  char word = 0;
   pollfd readable = {file, POLLIN, 0};
-  while (poll(&readable, 1, kStartTimeLimitMilliseconds) > 0) {
-    const auto count = read(file, buffer.data(), buffer.size());
-    if (count <= 0) {
-      return false;
-    }
-    if (std::memchr(buffer.data(), '\n', static_cast<std::size_t>(count)) != nullptr) {
-      return true;
-    }
-  }
-  return false;
+  return poll(&readable, 1, kStartTimeLimitMilliseconds) > 0 && read(file, &word, 1) > 0;
 }
 
 /// The children of a process with one thread.
@@ -89,7 +79,15 @@ Device::Device(const DeviceRoot& deviceRoot)
 }
 
 Device::~Device() {
-  while (endOneOther()) {
+  // What is killed leaves its own children to this process.
+  for (auto children = childrenOf(getpid()); children.size() > services.size();
+       children = childrenOf(getpid())) {
+    for (const pid_t child : children) {
+      if (!services.contains(child)) {
+        kill(child, SIGKILL);
+        awaitChild(child);
+      }
+    }
   }
   // The bus goes last, so that no service sees it go and ends in its own way meanwhile.
   for (const bool busItself : {false, true}) {
@@ -118,22 +116,15 @@ bool Device::start(const Profile& profile) {
 }
 
 bool Device::startService(const std::string& name) {
-  int ends[2] = {-1, -1};
-  if (pipe2(ends, O_CLOEXEC) != 0) {
-    complain("cannot start " + name + ": " + std::strerror(errno));
-    return false;
-  }
-  const FileDescriptor readable(ends[0]);
-  FileDescriptor writable(ends[1]);
   const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
   const auto log = root.path() / kRequestLogDirectory / (name + ".log");
-  const pid_t process = startChild({self, "--serve", name, log.string()}, {},
-                                   name == "manager" ? managerControl.get() : -1, writable.get());
-  writable = FileDescriptor();
-  if (process > 0) {
-    services[process] = name;
+  const auto child =
+      startChild({self, "--serve", name, log.string()},
+                 {.input = name == "manager" ? managerControl.get() : -1, .piped = STDOUT_FILENO});
+  if (child.process > 0) {
+    services[child.process] = name;
   }
-  const bool reachable = process > 0 && awaitLine(readable.get());
+  const bool reachable = child.process > 0 && awaitFirstWord(child.pipe.get());
   if (!reachable) {
     complain("the device's " + name + " did not start");
     std::cerr << std::ifstream(log).rdbuf();
@@ -142,7 +133,7 @@ bool Device::startService(const std::string& name) {
 }
 
 int Device::run(const std::vector<std::string>& command) {
-  const pid_t process = startChild(command, {SIGHUP, false}, -1, -1);
+  const pid_t process = startChild(command, {SIGHUP, false}).process;
   if (process < 0) {
     return EXIT_FAILURE;
   }
@@ -165,17 +156,6 @@ int Device::run(const std::vector<std::string>& command) {
     }
   }
   return *status;
-}
-
-bool Device::endOneOther() {
-  for (const pid_t child : childrenOf(getpid())) {
-    if (!services.contains(child)) {
-      kill(child, SIGKILL);
-      awaitChild(child);
-      return true;
-    }
-  }
-  return false;
 }
 
 std::optional<int> Device::reap(pid_t command) {

@@ -39,9 +39,6 @@ class Device {
  private:
   bool startService(const std::string& name);
 
-  /// Kills one child that is no service; false when there is none.
-  bool endOneOther();
-
   /// Collects the children that have ended; gives the exit status of `command` if it has.
   std::optional<int> reap(pid_t command);
 

@@ -1,138 +1,126 @@
 #include "simulator/journal.h"
 
+#include "platform/posix/whole_write.h"
 #include "simulator/child_process.h"
 #include "simulator/complaint.h"
-#include "simulator/journal_socket.h"
+#include "simulator/journal_entry.h"
 
-#include <fcntl.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
+#include <chrono>
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
-#include <fstream>
+#include <iostream>
+#include <iterator>
 #include <string>
-#include <string_view>
 #include <system_error>
-#include <utility>
 
 namespace simulator {
 
 namespace {
 
-/// A process that stores what is written to the pipe.
-struct StoringProcess {
-  pid_t process = -1;
-  FileDescriptor pipe = FileDescriptor();
+/// What a program of the device logs.
+struct Line {
+  const char* executable;
+  int process;
+  const char* unit;
+  const char* message;
 };
 
-StoringProcess startStoring(const std::filesystem::path& file) {
-  int ends[2] = {-1, -1};
-  if (pipe2(ends, O_CLOEXEC) != 0) {
-    complain(std::string("cannot make a pipe: ") + std::strerror(errno));
-    return {};
+/// In the order of the journal, again and again. The kernel is the one without a process.
+constexpr Line kLines[] = {
+    {"/usr/libexec/Linkward", 411, "linkward.service", "cell 310-410 chosen"},
+    {"/usr/libexec/LinkwardMobileHelper", 420, "linkward.service", "carrier settings 42 read"},
+    {"/usr/libexec/LinkwardRootHelper", 421, "linkward.service", "interface pdp0 brought up"},
+    {"/usr/libexec/vell-helper", 388, "vell-helper.service", "timestamp handed out"},
+    {"/usr/libexec/Airgroved", 402, "airgroved.service", "beacon lost"},
+    {"/usr/libexec/Linkward", 411, "linkward.service", "signal -97 dBm"},
+    {"/usr/libexec/Tessfield", 433, "tessfield.service", "map tile 7/64/42 loaded"},
+    {"/usr/libexec/voltkeeperd", 377, "voltkeeperd.service", "battery 81 %"},
+    {"/usr/lib/HaldenBaseband.framework/haldend", 395, "haldend.service", "modem awake"},
+    {"kernel", 0, "", "rpmsg: channel 7 opened"},
+    {"/usr/libexec/Airgroved", 402, "airgroved.service", "beacon found again"},
+    {"/usr/libexec/Linkward", 411, "linkward.service", "registered, roaming off"},
+    {"/usr/libexec/voltkeeperd", 377, "voltkeeperd.service", "charging ended"},
+    {"/usr/lib/HaldenBaseband.framework/haldend", 395, "haldend.service", "trace buffer at 12 %"},
+    {"/usr/sbin/timed", 301, "timed.service", "clock 3 ms ahead"},
+    {"/usr/sbin/sshd", 512, "ssh.service", "connection closed"},
+};
+
+JournalEntry makeEntry(JournalTime time, const Line& line, std::size_t round) {
+  const std::string executable(line.executable);
+  const auto name = executable.substr(executable.rfind('/') + 1);
+  JournalEntry entry = {
+      time, {{"MESSAGE", line.message}, {"PRIORITY", "6"}, {"SYSLOG_IDENTIFIER", name}}};
+  if (line.process == 0) {
+    entry.fields.emplace_back("_TRANSPORT", "kernel");
+    return entry;
   }
-  const FileDescriptor readable(ends[0]);
-  StoringProcess started{-1, FileDescriptor(ends[1])};
-  started.process = startChild({VELL_JOURNAL_REMOTE, "-o", file.string(), "-"}, {}, readable.get(),
-                               STDERR_FILENO);
-  return started;
+  const auto thread = line.process + static_cast<int>(round % 3);
+  entry.fields.insert(entry.fields.end(), {{"_PID", std::to_string(line.process)},
+                                           {"TID", std::to_string(thread)},
+                                           {"_COMM", name.substr(0, 15)},
+                                           {"_EXE", executable},
+                                           {"_SYSTEMD_UNIT", line.unit},
+                                           {"_TRANSPORT", "journal"}});
+  return entry;
 }
 
-bool writeAll(int file, std::string_view bytes) {
-  while (!bytes.empty()) {
-    const auto written = write(file, bytes.data(), bytes.size());
-    if (written < 0 && errno != EINTR) {
-      return false;
-    }
-    bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
+/// What the device has logged in the hour up to `now`, in the export format.
+std::string lastHour(JournalTime now) {
+  constexpr std::size_t kEntries = 240;
+  constexpr std::chrono::microseconds kHour = std::chrono::hours(1);
+  std::string text;
+  for (std::size_t at = 0; at < kEntries; ++at) {
+    const auto time = now - kHour * (kEntries - at) / (kEntries + 1);
+    const auto& line = kLines[at % std::size(kLines)];
+    text += toExportFormat(makeEntry(time, line, at / std::size(kLines)));
   }
-  return true;
+  return text;
 }
 
-/// Stores `entries` and waits until they are there.
-bool storeAll(const std::filesystem::path& file, const std::vector<JournalEntry>& entries) {
+/// Starts a process that stores, in `file`, what is written to its pipe in the export format.
+Child startStoring(const std::filesystem::path& file) {
+  return startChild({VELL_JOURNAL_REMOTE, "-o", file.string(), "-"},
+                    {.output = STDERR_FILENO, .piped = STDIN_FILENO});
+}
+
+/// Stores `text` and waits until it is there.
+bool store(const std::filesystem::path& file, const std::string& text) {
   auto storing = startStoring(file);
-  if (storing.process < 0) {
-    return false;
-  }
-  bool written = true;
-  for (const auto& entry : entries) {
-    written = written && writeAll(storing.pipe.get(), toExportFormat(entry));
-  }
+  const bool written = storing.process > 0 && !writeWhole(storing.pipe.get(), text);
   storing.pipe = FileDescriptor();
-  return awaitChild(storing.process) == 0 && written;
-}
-
-/// Adds what the journal itself knows of a process, as far as that still can be learned.
-void addSender(JournalEntry& entry, const ucred& sender) {
-  const auto process = std::filesystem::path("/proc") / std::to_string(sender.pid);
-  std::string name;
-  std::error_code error;
-  const auto executable = std::filesystem::read_symlink(process / "exe", error);
-  entry.fields.emplace_back("_TRANSPORT", "journal");
-  entry.fields.emplace_back("_PID", std::to_string(sender.pid));
-  entry.fields.emplace_back("_UID", std::to_string(sender.uid));
-  entry.fields.emplace_back("_GID", std::to_string(sender.gid));
-  if (std::getline(std::ifstream(process / "comm"), name)) {
-    entry.fields.emplace_back("_COMM", name);
-  }
-  if (!error) {
-    entry.fields.emplace_back("_EXE", executable.string());
-  }
+  return storing.process > 0 && awaitChild(storing.process) == 0 && written;
 }
 
 }  // namespace
 
-std::unique_ptr<Journal> Journal::create(const std::filesystem::path& root,
-                                         const std::vector<JournalEntry>& entries) {
+int serveJournal(const std::filesystem::path& root) {
   // A process that stores and dies is noticed when it is written to.
   std::signal(SIGPIPE, SIG_IGN);
   const auto file = root / kJournalFile;
-  const auto path = root / kJournalSocket;
   std::error_code error;
   std::filesystem::create_directories(file.parent_path(), error);
-  std::filesystem::create_directories(path.parent_path(), error);
-  if (!storeAll(file, entries)) {
+  if (!store(file, lastHour(presentTime()))) {
     complain("the device's journal could not be stored");
-    return nullptr;
+    return EXIT_FAILURE;
   }
-  auto listening = listenForLog(path);
-  auto storing = startStoring(file);
-  if (!listening || storing.process < 0) {
-    return nullptr;
+  const auto socket = listenForEntries(root / "run/systemd/journal/socket");
+  const auto storing = startStoring(file);
+  if (!socket || storing.process < 0) {
+    return EXIT_FAILURE;
   }
-  return std::unique_ptr<Journal>(
-      new Journal(std::move(listening), storing.process, std::move(storing.pipe)));
-}
-
-Journal::~Journal() {
-  pipe = FileDescriptor();
-  awaitChild(storing);
-}
-
-int Journal::run() {
-  while (storeNext()) {
+  std::cout << "ready" << std::endl;
+  while (const auto entry = receiveEntry(socket.get(), 0)) {
+    // One that is malformed has no fields.
+    if (!entry->fields.empty() && writeWhole(storing.pipe.get(), toExportFormat(*entry))) {
+      break;
+    }
   }
   complain(std::string("the device's journal is lost: ") + std::strerror(errno));
   return EXIT_FAILURE;
-}
-
-/// Waits for a message and stores it; one that is malformed is dropped.
-bool Journal::storeNext() {
-  const auto datagram = receiveLog(socket.get(), 0);
-  if (!datagram) {
-    return false;
-  }
-  auto entry = fromNativeProtocol(datagram->bytes);
-  if (!entry || entry->fields.empty()) {
-    return true;
-  }
-  entry->time = std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
-  addSender(*entry, datagram->sender);
-  return writeAll(pipe.get(), toExportFormat(*entry));
 }
 
 }  // namespace simulator

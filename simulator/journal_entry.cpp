@@ -1,14 +1,29 @@
 #include "simulator/journal_entry.h"
 
+#include "simulator/complaint.h"
+
 #include <endian.h>
+#include <fcntl.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
 
 #include <algorithm>
+#include <array>
+#include <cerrno>
 #include <cstdint>
 #include <cstring>
+#include <fstream>
+#include <string_view>
+#include <system_error>
 
 namespace simulator {
 
 namespace {
+
+using Fields = std::vector<std::pair<std::string, std::string>>;
+
+constexpr std::size_t kLargestDatagram = 1U << 18U;
 
 /// Entries of one boot; the files of a journal tell boots apart.
 constexpr const char* kBoot = "5b2e8c1d4f6a47909c3d1e0f2a4b6c8d";
@@ -50,52 +65,63 @@ bool isFieldName(std::string_view name) {
   });
 }
 
-struct Program {
-  std::string executable;
-  int process;
-  std::string unit;
-  std::vector<std::string> messages;
-};
-
-const std::vector<Program>& programs() {
-  static const auto& all = *new std::vector<Program>{
-      {"/usr/libexec/Linkward",
-       411,
-       "linkward.service",
-       {"cell 310-410 chosen", "signal -97 dBm", "registered, roaming off"}},
-      {"/usr/libexec/LinkwardMobileHelper", 420, "linkward.service", {"carrier settings 42 read"}},
-      {"/usr/libexec/LinkwardRootHelper", 421, "linkward.service", {"interface pdp0 brought up"}},
-      {"/usr/libexec/vell-helper", 388, "vell-helper.service", {"timestamp handed out"}},
-      {"/usr/libexec/Airgroved", 402, "airgroved.service", {"beacon lost", "beacon found again"}},
-      {"/usr/libexec/Tessfield", 433, "tessfield.service", {"map tile 7/64/42 loaded"}},
-      {"/usr/libexec/voltkeeperd", 377, "voltkeeperd.service", {"battery 81 %", "charging ended"}},
-      {"/usr/lib/HaldenBaseband.framework/haldend",
-       395,
-       "haldend.service",
-       {"modem awake", "trace buffer at 12 %"}},
-      {"/usr/sbin/timed", 301, "timed.service", {"clock 3 ms ahead"}},
-      {"/usr/sbin/sshd", 512, "ssh.service", {"connection closed"}},
-  };
-  return all;
+/// The fields of a datagram that a program can set itself; none when it is malformed.
+Fields parseFields(std::string_view datagram) {
+  Fields fields;
+  while (!datagram.empty()) {
+    const auto line = datagram.substr(0, datagram.find('\n'));
+    if (line.size() == datagram.size()) {
+      return {};
+    }
+    datagram.remove_prefix(line.size() + 1);
+    const auto name = line.substr(0, line.find('='));
+    const auto value = name.size() < line.size() ? std::optional(line.substr(name.size() + 1))
+                                                 : takeSizedValue(datagram);
+    if (!value || !isFieldName(name)) {
+      return {};
+    }
+    if (name.front() != '_') {
+      fields.emplace_back(name, *value);
+    }
+  }
+  return fields;
 }
 
-JournalEntry makeEntry(std::chrono::sys_time<std::chrono::microseconds> time,
-                       const Program& program, std::size_t round) {
-  const auto name = program.executable.substr(program.executable.rfind('/') + 1);
-  const auto process = std::to_string(program.process);
-  return {time,
-          {{"MESSAGE", program.messages[round % program.messages.size()]},
-           {"PRIORITY", "6"},
-           {"SYSLOG_IDENTIFIER", name},
-           {"_PID", process},
-           {"TID", std::to_string(program.process + static_cast<int>(round % 3))},
-           {"_COMM", name.substr(0, 15)},
-           {"_EXE", program.executable},
-           {"_SYSTEMD_UNIT", program.unit},
-           {"_TRANSPORT", "journal"}}};
+/// The content of a file in memory that its sender cannot change any more.
+std::string contentOfSealed(const FileDescriptor& file) {
+  constexpr int kAllSeals = F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE | F_SEAL_SEAL;
+  struct stat status {};
+  if (fcntl(file.get(), F_GET_SEALS) != kAllSeals || fstat(file.get(), &status) != 0) {
+    return "";
+  }
+  std::string content(static_cast<std::size_t>(status.st_size), '\0');
+  const auto size = pread(file.get(), content.data(), content.size(), 0);
+  return size == status.st_size ? content : "";
+}
+
+/// Adds what the journal itself knows of a process, as far as that still can be learned.
+void addSender(Fields& fields, const ucred& sender) {
+  const auto process = std::filesystem::path("/proc") / std::to_string(sender.pid);
+  std::string name;
+  std::error_code error;
+  const auto executable = std::filesystem::read_symlink(process / "exe", error);
+  fields.emplace_back("_TRANSPORT", "journal");
+  fields.emplace_back("_PID", std::to_string(sender.pid));
+  fields.emplace_back("_UID", std::to_string(sender.uid));
+  fields.emplace_back("_GID", std::to_string(sender.gid));
+  if (std::getline(std::ifstream(process / "comm"), name)) {
+    fields.emplace_back("_COMM", name);
+  }
+  if (!error) {
+    fields.emplace_back("_EXE", executable.string());
+  }
 }
 
 }  // namespace
+
+JournalTime presentTime() {
+  return std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
+}
 
 std::string toExportFormat(const JournalEntry& entry) {
   const auto time = std::to_string(entry.time.time_since_epoch().count());
@@ -109,47 +135,57 @@ std::string toExportFormat(const JournalEntry& entry) {
   return text + "\n";
 }
 
-std::optional<JournalEntry> fromNativeProtocol(std::string_view datagram) {
-  JournalEntry entry;
-  while (!datagram.empty()) {
-    const auto line = datagram.substr(0, datagram.find('\n'));
-    if (line.size() == datagram.size()) {
-      return std::nullopt;
-    }
-    datagram.remove_prefix(line.size() + 1);
-    const auto name = line.substr(0, line.find('='));
-    const auto value = name.size() < line.size() ? std::optional(line.substr(name.size() + 1))
-                                                 : takeSizedValue(datagram);
-    if (!value || !isFieldName(name)) {
-      return std::nullopt;
-    }
-    if (name.front() != '_') {
-      entry.fields.emplace_back(name, *value);
-    }
+FileDescriptor listenForEntries(const std::filesystem::path& path) {
+  std::error_code ignored;
+  std::filesystem::create_directories(path.parent_path(), ignored);
+  // Reached through its folder, because the path of a socket must be short, see unix(7).
+  const FileDescriptor folder(open(path.parent_path().c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
+  FileDescriptor listening(socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+  const auto reachable =
+      "/proc/self/fd/" + std::to_string(folder.get()) + "/" + path.filename().string();
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  reachable.copy(address.sun_path, sizeof address.sun_path - 1);
+  const int on = 1;
+  if (!folder || !listening ||
+      setsockopt(listening.get(), SOL_SOCKET, SO_PASSCRED, &on, sizeof on) != 0 ||
+      bind(listening.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) {
+    complain(path.string() + ": " + std::strerror(errno));
+    return FileDescriptor();
   }
-  return entry;
+  return listening;
 }
 
-std::vector<JournalEntry> lastHourOfDevice(std::chrono::sys_time<std::chrono::microseconds> now) {
-  constexpr std::size_t kEntries = 240;
-  constexpr std::chrono::microseconds kHour = std::chrono::hours(1);
-  std::vector<JournalEntry> entries;
-  entries.reserve(kEntries);
-  for (std::size_t at = 0; at < kEntries; ++at) {
-    const auto age = kHour * (kEntries - at) / (kEntries + 1);
-    const auto turn = at % (programs().size() + 1);
-    const auto round = at / (programs().size() + 1);
-    if (turn < programs().size()) {
-      entries.push_back(makeEntry(now - age, programs()[turn], round));
-    } else {
-      entries.push_back({now - age,
-                         {{"MESSAGE", "rpmsg: channel " + std::to_string(round) + " opened"},
-                          {"PRIORITY", "6"},
-                          {"SYSLOG_IDENTIFIER", "kernel"},
-                          {"_TRANSPORT", "kernel"}}});
+std::optional<JournalEntry> receiveEntry(int socket, int flags) {
+  std::string bytes(kLargestDatagram, '\0');
+  iovec part{bytes.data(), bytes.size()};
+  alignas(cmsghdr) std::array<char, CMSG_SPACE(sizeof(ucred)) + CMSG_SPACE(sizeof(int))> control{};
+  msghdr message{};
+  message.msg_iov = &part;
+  message.msg_iovlen = 1;
+  message.msg_control = control.data();
+  message.msg_controllen = control.size();
+  const auto size = recvmsg(socket, &message, MSG_CMSG_CLOEXEC | flags);
+  if (size < 0) {
+    return std::nullopt;
+  }
+  bytes.resize(static_cast<std::size_t>(size));
+  ucred sender{};
+  for (auto* header = CMSG_FIRSTHDR(&message); header != nullptr;
+       header = CMSG_NXTHDR(&message, header)) {
+    if (header->cmsg_type == SCM_CREDENTIALS) {
+      std::memcpy(&sender, CMSG_DATA(header), sizeof sender);
+    } else if (header->cmsg_type == SCM_RIGHTS) {
+      int descriptor = -1;
+      std::memcpy(&descriptor, CMSG_DATA(header), sizeof descriptor);
+      bytes = contentOfSealed(FileDescriptor(descriptor));
     }
   }
-  return entries;
+  JournalEntry entry = {presentTime(), parseFields(bytes)};
+  if (!entry.fields.empty()) {
+    addSender(entry.fields, sender);
+  }
+  return entry;
 }
 
 }  // namespace simulator

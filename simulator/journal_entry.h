@@ -1,28 +1,38 @@
 #pragma once
 
+#include "platform/posix/file_descriptor.h"
+
 #include <chrono>
+#include <filesystem>
 #include <optional>
 #include <string>
-#include <string_view>
 #include <utility>
 #include <vector>
 
 namespace simulator {
 
+using JournalTime = std::chrono::sys_time<std::chrono::microseconds>;
+
+/// The time by the clock of the machine.
+JournalTime presentTime();
+
 /// One entry of the journal: when it was stored, and its fields, see systemd.journal-fields(7).
 struct JournalEntry {
-  std::chrono::sys_time<std::chrono::microseconds> time;
+  JournalTime time;
   std::vector<std::pair<std::string, std::string>> fields;
 };
 
 /// `entry` in the export format of the journal, see https://systemd.io/JOURNAL_EXPORT_FORMATS.
 std::string toExportFormat(const JournalEntry& entry);
 
-/// The fields of one datagram of the journal's native protocol, without those that a program cannot
-/// set itself. Empty when it is malformed.
-std::optional<JournalEntry> fromNativeProtocol(std::string_view datagram);
+/// Makes the journal's socket at `path`, however deep that lies, and the folders above it. None,
+/// after a complaint, when it cannot be.
+FileDescriptor listenForEntries(const std::filesystem::path& path);
 
-/// What a device has logged in the hour up to `now`: its daemons, their libraries, its kernel.
-std::vector<JournalEntry> lastHourOfDevice(std::chrono::sys_time<std::chrono::microseconds> now);
+/// Takes what one datagram of the journal's native protocol holds off such a socket, with `flags`
+/// as of recvmsg(2), see https://systemd.io/JOURNAL_NATIVE_PROTOCOL. Leaves out the fields that a
+/// program cannot set itself, and adds what the journal knows of the sender. An entry that is
+/// malformed has no fields. Empty, and errno is set, when the socket gives none.
+std::optional<JournalEntry> receiveEntry(int socket, int flags);
 
 }  // namespace simulator

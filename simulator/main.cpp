@@ -1,123 +1,143 @@
 // The simulated device's entry point: a whole device, or one of its services alone.
 
 #include "platform/device/sysroot.h"
+#include "platform/posix/file_descriptor.h"
 #include "platform/program.h"
 #include "simulator/complaint.h"
 #include "simulator/device.h"
 #include "simulator/device_root.h"
-#include "simulator/helper_service.h"
 #include "simulator/journal.h"
-#include "simulator/manager_service.h"
-#include "simulator/options.h"
 #include "simulator/profile.h"
+#include "simulator/service.h"
 
+#include <fcntl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
-#include <chrono>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <iostream>
+#include <iterator>
+#include <map>
+#include <string>
+#include <vector>
+
+namespace simulator {
 
 namespace {
 
-using simulator::complain;
+using Words = std::vector<std::string>;
 
 constexpr int kUsageError = 2;
 
-/// Has what a service and the programs it starts say on standard error go to `log`, if there is
-/// one.
-void redirectErrors(const std::string& log) {
-  if (!log.empty() && std::freopen(log.c_str(), "a", stderr) == nullptr) {
-    complain(log + ": " + std::strerror(errno));
-  }
+int refuse(const std::string& what) {
+  complain(what +
+           "; usage: vell-simulator [PROFILE] [-- COMMAND...] | "
+           "--serve bus|manager|helper|journal [LOGFILE]");
+  return kUsageError;
 }
 
 /// Becomes the daemon, which prints its address on standard output once it can be reached.
 int serveBus() {
-  const auto configuration = "--config-file=" + (sysroot() / simulator::kBusConfiguration).string();
+  const auto configuration = "--config-file=" + (sysroot() / kBusConfiguration).string();
   // A socket that an earlier daemon left behind would be in the way.
-  unlink((sysroot() / simulator::kBusSocket).c_str());
+  unlink((sysroot() / kBusSocket).c_str());
   execlp("dbus-daemon", "dbus-daemon", "--nofork", "--nopidfile", "--nosyslog", "--print-address",
          configuration.c_str(), nullptr);
   complain(std::string("dbus-daemon: ") + std::strerror(errno));
   return EXIT_FAILURE;
 }
 
-int serveJournal() {
-  const auto now = std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
-  const auto journal = simulator::Journal::create(sysroot(), simulator::lastHourOfDevice(now));
-  if (!journal) {
-    return EXIT_FAILURE;
-  }
-  std::cout << "ready" << std::endl;
-  return journal->run();
+template <auto serveDevice>
+int serveByProfile() {
+  const auto profile = readProfile(sysroot() / kDeviceProfile);
+  return profile ? serveDevice(*profile, sysroot()) : EXIT_FAILURE;
 }
 
-template <typename NamedService>
-int serveNamed(const simulator::Profile& profile, const std::string& requestLog) {
-  const simulator::RequestLog log(requestLog);
-  NamedService service(profile, sysroot(), log);
-  if (!service.connect()) {
-    return EXIT_FAILURE;
+/// Has std::clog, which gets the requests, lead to the file at `path`, and what this process and
+/// the programs that it starts say on standard error, too. Without a path requests go to standard
+/// output. Complains and returns false when the file cannot be written.
+bool openLog(const std::string& path) {
+  if (path.empty()) {
+    std::clog.rdbuf(std::cout.rdbuf());
+    return true;
   }
-  std::cout << "ready" << std::endl;
-  return service.run();
+  const FileDescriptor file(open(path.c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0644));
+  if (!file || dup2(file.get(), STDERR_FILENO) < 0) {
+    complain(path + ": " + std::strerror(errno));
+    return false;
+  }
+  std::clog.rdbuf(std::cerr.rdbuf());
+  return true;
 }
 
-int serve(const simulator::Options& options) {
+/// Is one service of a device: `words` are its name and perhaps a file to log in.
+int serve(const Words& words) {
+  const std::map<std::string, int (*)()> services = {
+      {"bus", serveBus},
+      {"manager", serveByProfile<serveManager>},
+      {"helper", serveByProfile<serveHelper>},
+      {"journal", [] { return serveJournal(sysroot()); }},
+  };
+  if (words.empty() || words.size() > 2) {
+    return refuse("--serve takes a service and perhaps a file");
+  }
+  const auto& name = words.front();
+  const auto service = services.find(name);
+  if (service == services.end()) {
+    return refuse("no service is called \"" + name + "\"");
+  }
   if (isLocalMachine()) {
     complain("--serve works inside a simulated device only");
     return EXIT_FAILURE;
   }
-  redirectErrors(options.requestLog);
-  std::ofstream(sysroot() / "run" / (options.service + ".pid")) << getpid() << "\n";
-  if (options.service == "bus") {
-    return serveBus();
-  }
-  if (options.service == "journal") {
-    return serveJournal();
-  }
-  const auto profile = simulator::readProfile(sysroot() / simulator::kDeviceProfile);
-  if (!profile) {
-    return EXIT_FAILURE;
-  }
-  return options.service == "manager"
-             ? serveNamed<simulator::ManagerService>(*profile, options.requestLog)
-             : serveNamed<simulator::HelperService>(*profile, options.requestLog);
+  std::ofstream(sysroot() / "run" / (name + ".pid")) << getpid() << "\n";
+  return openLog(words.size() == 2 ? words.back() : "") ? service->second() : EXIT_FAILURE;
 }
 
-std::vector<std::string> usersShell() {
-  const char* shell = std::getenv("SHELL");
-  return {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
-}
-
-int runDevice(const simulator::Options& options) {
-  simulator::blockDeviceSignals();
-  const auto profile = simulator::readProfile(options.profile);
-  if (!profile) {
-    return EXIT_FAILURE;
+/// Runs a command, by default the user's shell, in the device of the profile at `profilePath`.
+int runDevice(const std::string& profilePath, Words command) {
+  if (command.empty()) {
+    const char* shell = std::getenv("SHELL");
+    command = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
   }
-  const auto root = simulator::DeviceRoot::create(*profile);
+  blockDeviceSignals();
+  const auto profile = readProfile(profilePath);
+  const auto root = profile ? DeviceRoot::create(*profile) : nullptr;
   if (!root) {
     return EXIT_FAILURE;
   }
-  simulator::Device device(*root);
-  if (!device.start(*profile)) {
-    return EXIT_FAILURE;
+  Device device(*root);
+  return device.start(*profile) ? device.run(command) : EXIT_FAILURE;
+}
+
+int run(const Words& words) {
+  if (!words.empty() && words.front() == "--serve") {
+    return serve({words.begin() + 1, words.end()});
   }
-  return device.run(options.command.empty() ? usersShell() : options.command);
+  const auto separator = std::find(words.begin(), words.end(), "--");
+  if (separator - words.begin() > 1) {
+    return refuse("more than one profile");
+  }
+  const bool hasProfile = separator != words.begin();
+  if (hasProfile && (words.front().empty() || words.front().front() == '-')) {
+    return refuse("\"" + words.front() + "\" is no profile");
+  }
+  const bool hasCommand = separator != words.end();
+  if (hasCommand && std::next(separator) == words.end()) {
+    return refuse("no command after --");
+  }
+  return runDevice(hasProfile ? words.front() : "",
+                   {hasCommand ? std::next(separator) : separator, words.end()});
 }
 
 }  // namespace
 
+}  // namespace simulator
+
 int main(int count, char** words) {
   prepareStandardStreams();
-  const auto options = simulator::parseOptions({words + (count > 0 ? 1 : 0), words + count});
-  if (!options) {
-    return kUsageError;
-  }
-  return options->service.empty() ? runDevice(*options) : serve(*options);
+  return simulator::run({words + (count > 0 ? 1 : 0), words + count});
 }

@@ -1,7 +1,8 @@
 #pragma once
 
 #include "simulator/journal_entry.h"
-#include "simulator/journal_socket.h"
+
+#include <sys/socket.h>
 
 #include <map>
 #include <stdexcept>
@@ -14,8 +15,7 @@ class SystemLogSocket {
  public:
   /// Takes the place of the journal below `root`. Throws std::runtime_error when it cannot.
   explicit SystemLogSocket(const std::filesystem::path& root) {
-    std::filesystem::create_directories(root / "run/systemd/journal");
-    socket = simulator::listenForLog(root / "run/systemd/journal/socket");
+    socket = simulator::listenForEntries(root / "run/systemd/journal/socket");
     if (!socket) {
       throw std::runtime_error("no socket below " + root.string());
     }
@@ -24,9 +24,8 @@ class SystemLogSocket {
   /// The MESSAGE of each entry at priority `err` that has come since the last call.
   std::vector<std::string> messages() {
     std::vector<std::string> found;
-    while (const auto datagram = simulator::receiveLog(socket.get(), MSG_DONTWAIT)) {
-      const auto fields = simulator::fromNativeProtocol(datagram->bytes).value().fields;
-      std::map<std::string, std::string> values(fields.begin(), fields.end());
+    while (const auto entry = simulator::receiveEntry(socket.get(), MSG_DONTWAIT)) {
+      std::map<std::string, std::string> values(entry->fields.begin(), entry->fields.end());
       if (values["PRIORITY"] == "3") {
         found.push_back(values["MESSAGE"]);
       }
