@@ -3,10 +3,8 @@
 #include "simulator/child_process.h"
 #include "simulator/complaint.h"
 #include "simulator/device_root.h"
-#include "simulator/profile.h"
 #include "simulator/service.h"
 
-#include <fcntl.h>
 #include <poll.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
@@ -20,6 +18,8 @@
 #include <fstream>
 #include <iostream>
 #include <iterator>
+#include <map>
+#include <optional>
 
 namespace simulator {
 
@@ -62,117 +62,130 @@ void signalFamily(pid_t process, int signalNumber) {
   }
 }
 
+/// The processes of one device. Everything still running is killed with the object.
+class Device {
+ public:
+  /// Sets the environment for the device at `deviceRoot`, which must outlive this.
+  explicit Device(const DeviceRoot& deviceRoot) : root(deviceRoot) {
+    setenv("VELL_SYSROOT", root.path().c_str(), 1);
+    setenv("DBUS_SYSTEM_BUS_ADDRESS", root.busAddress().c_str(), 1);
+    // What the command has started becomes a child of this process when its own parent ends.
+    prctl(PR_SET_CHILD_SUBREAPER, 1);
+  }
+  Device(const Device&) = delete;
+  Device& operator=(const Device&) = delete;
+
+  ~Device() {
+    // What is killed leaves its own children to this process.
+    for (auto children = childrenOf(getpid()); children.size() > services.size();
+         children = childrenOf(getpid())) {
+      for (const pid_t child : children) {
+        if (!services.contains(child)) {
+          end(child);
+        }
+      }
+    }
+    // The bus goes last, so that no service sees it go and ends in its own way meanwhile.
+    for (const bool busItself : {false, true}) {
+      for (const auto& [process, name] : services) {
+        if ((name == "bus") == busItself) {
+          end(process);
+        }
+      }
+    }
+  }
+
+  /// Starts what runs on the device; false, after a complaint, when something cannot be started.
+  bool start(const Profile& profile) {
+    return (!profile.journal || startService("journal")) &&
+           (!profile.bus || (startService("bus") && (!profile.manager || startService("manager")) &&
+                             (!profile.helper || startService("helper"))));
+  }
+
+  /// Runs `command` and returns its exit status.
+  int run(const std::vector<std::string>& command) {
+    const pid_t process = startChild(command, {SIGHUP, false}).process;
+    if (process < 0) {
+      return EXIT_FAILURE;
+    }
+    const auto signals = deviceSignals();
+    bool ending = false;
+    auto status = reap(process);
+    for (; !status; status = reap(process)) {
+      siginfo_t info{};
+      const int received =
+          ending ? sigtimedwait(&signals, &info, &kTimeToObey) : sigwaitinfo(&signals, &info);
+      if (received < 0 && errno == EAGAIN) {
+        kill(process, SIGKILL);
+      }
+      // What the terminal sends for its keys has reached the command already.
+      const bool fromTerminal =
+          (received == SIGINT || received == SIGQUIT) && info.si_code == SI_KERNEL;
+      if (received > 0 && received != SIGCHLD && !fromTerminal) {
+        signalFamily(process, received);
+        ending = true;
+      }
+    }
+    return *status;
+  }
+
+ private:
+  bool startService(const std::string& name) {
+    const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
+    const auto log = root.path() / kLogDirectory / (name + ".log");
+    const auto child = startChild(
+        {self, "--serve", name, log.string()},
+        {.input = name == "manager" ? root.managerControl() : -1, .piped = STDOUT_FILENO});
+    if (child.process > 0) {
+      services[child.process] = name;
+    }
+    const bool reachable = child.process > 0 && awaitFirstWord(child.pipe.get());
+    if (!reachable) {
+      complain("the device's " + name + " did not start");
+      std::cerr << std::ifstream(log).rdbuf();
+    }
+    return reachable;
+  }
+
+  /// Collects the children that have ended; gives the exit status of `command` if it has.
+  std::optional<int> reap(pid_t command) {
+    std::optional<int> commandStatus;
+    int status = 0;
+    for (pid_t ended = waitpid(-1, &status, WNOHANG); ended > 0;
+         ended = waitpid(-1, &status, WNOHANG)) {
+      if (ended == command) {
+        commandStatus = exitStatusOf(status);
+        continue;
+      }
+      const auto service = services.extract(ended);
+      if (service && exitStatusOf(status) == kStatusRestart) {
+        startService(service.mapped());
+      }
+    }
+    return commandStatus;
+  }
+
+  static void end(pid_t child) {
+    kill(child, SIGKILL);
+    awaitChild(child);
+  }
+
+  const DeviceRoot& root;
+  std::map<pid_t, std::string> services;
+};
+
 }  // namespace
 
-void blockDeviceSignals() {
+int runOnDevice(const Profile& profile, const std::vector<std::string>& command) {
+  // Blocked before anything is started or written, so that all of it is cleaned up.
   const auto signals = deviceSignals();
   sigprocmask(SIG_BLOCK, &signals, nullptr);
-}
-
-Device::Device(const DeviceRoot& deviceRoot)
-    : root(deviceRoot),
-      managerControl(open((deviceRoot.path() / kManagerControl).c_str(), O_RDWR | O_CLOEXEC)) {
-  setenv("VELL_SYSROOT", root.path().c_str(), 1);
-  setenv("DBUS_SYSTEM_BUS_ADDRESS", root.busAddress().c_str(), 1);
-  // What the command has started becomes a child of this process when its own parent ends.
-  prctl(PR_SET_CHILD_SUBREAPER, 1);
-}
-
-Device::~Device() {
-  // What is killed leaves its own children to this process.
-  for (auto children = childrenOf(getpid()); children.size() > services.size();
-       children = childrenOf(getpid())) {
-    for (const pid_t child : children) {
-      if (!services.contains(child)) {
-        kill(child, SIGKILL);
-        awaitChild(child);
-      }
-    }
-  }
-  // The bus goes last, so that no service sees it go and ends in its own way meanwhile.
-  for (const bool busItself : {false, true}) {
-    for (const auto& [process, name] : services) {
-      if ((name == "bus") == busItself) {
-        kill(process, SIGKILL);
-        awaitChild(process);
-      }
-    }
-  }
-}
-
-bool Device::start(const Profile& profile) {
-  if (!managerControl) {
-    complain("cannot open the manager's control pipe");
-    return false;
-  }
-  if (profile.journal && !startService("journal")) {
-    return false;
-  }
-  if (!profile.bus) {
-    return true;
-  }
-  return startService("bus") && (!profile.manager || startService("manager")) &&
-         (!profile.helper || startService("helper"));
-}
-
-bool Device::startService(const std::string& name) {
-  const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
-  const auto log = root.path() / kRequestLogDirectory / (name + ".log");
-  const auto child =
-      startChild({self, "--serve", name, log.string()},
-                 {.input = name == "manager" ? managerControl.get() : -1, .piped = STDOUT_FILENO});
-  if (child.process > 0) {
-    services[child.process] = name;
-  }
-  const bool reachable = child.process > 0 && awaitFirstWord(child.pipe.get());
-  if (!reachable) {
-    complain("the device's " + name + " did not start");
-    std::cerr << std::ifstream(log).rdbuf();
-  }
-  return reachable;
-}
-
-int Device::run(const std::vector<std::string>& command) {
-  const pid_t process = startChild(command, {SIGHUP, false}).process;
-  if (process < 0) {
+  const auto root = DeviceRoot::create(profile);
+  if (!root) {
     return EXIT_FAILURE;
   }
-  const auto signals = deviceSignals();
-  bool ending = false;
-  auto status = reap(process);
-  for (; !status; status = reap(process)) {
-    siginfo_t info{};
-    const int received =
-        ending ? sigtimedwait(&signals, &info, &kTimeToObey) : sigwaitinfo(&signals, &info);
-    if (received < 0 && errno == EAGAIN) {
-      kill(process, SIGKILL);
-    }
-    // What the terminal sends for its keys has reached the command already.
-    const bool fromTerminal =
-        (received == SIGINT || received == SIGQUIT) && info.si_code == SI_KERNEL;
-    if (received > 0 && received != SIGCHLD && !fromTerminal) {
-      signalFamily(process, received);
-      ending = true;
-    }
-  }
-  return *status;
-}
-
-std::optional<int> Device::reap(pid_t command) {
-  std::optional<int> commandStatus;
-  int status = 0;
-  for (pid_t ended = waitpid(-1, &status, WNOHANG); ended > 0;
-       ended = waitpid(-1, &status, WNOHANG)) {
-    if (ended == command) {
-      commandStatus = exitStatusOf(status);
-      continue;
-    }
-    const auto service = services.extract(ended);
-    if (service && exitStatusOf(status) == kStatusRestart) {
-      startService(service.mapped());
-    }
-  }
-  return commandStatus;
+  Device device(*root);
+  return device.start(profile) ? device.run(command) : EXIT_FAILURE;
 }
 
 }  // namespace simulator

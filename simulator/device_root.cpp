@@ -1,7 +1,9 @@
 #include "simulator/device_root.h"
 
+#include "simulator/child_process.h"
 #include "simulator/complaint.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <cerrno>
@@ -11,6 +13,7 @@
 #include <sstream>
 #include <string_view>
 #include <system_error>
+#include <vector>
 
 namespace simulator {
 
@@ -18,11 +21,10 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// Where the live traces are.
-constexpr const char* kScratchDirectories[] = {
-    "private/var/wireless/Library/Logs/VellManager/DIAG.scratch",
-    "private/var/wireless/Library/Logs/VellManager/QDSS.scratch",
-};
+// Where collections are made, and where the live traces are.
+constexpr const char* kSnapshotDirectory = "private/var/wireless/Library/Logs/Faultkeeper/Baseband";
+constexpr const char* kDiagDirectory = "private/var/wireless/Library/Logs/VellManager/DIAG.scratch";
+constexpr const char* kQdssDirectory = "private/var/wireless/Library/Logs/VellManager/QDSS.scratch";
 
 /// Throws std::system_error.
 void writeFile(const fs::path& path, const std::string& text) {
@@ -54,20 +56,18 @@ std::string escapeForAddress(const std::string& text) {
 
 /// A bus on which everybody may do everything: it is the device's owner who runs it.
 std::string busConfiguration(const std::string& address) {
-  return "<!DOCTYPE busconfig PUBLIC \"-//freedesktop//DTD D-Bus Bus Configuration 1.0//EN\"\n"
-         " \"http://www.freedesktop.org/standards/dbus/1.0/busconfig.dtd\">\n"
-         "<busconfig>\n"
-         "  <listen>" +
-         address +
-         "</listen>\n"
-         "  <auth>EXTERNAL</auth>\n"
-         "  <policy context=\"default\">\n"
-         "    <allow user=\"*\"/>\n"
-         "    <allow own=\"*\"/>\n"
-         "    <allow send_destination=\"*\"/>\n"
-         "    <allow receive_sender=\"*\"/>\n"
-         "  </policy>\n"
-         "</busconfig>\n";
+  return R"(<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configuration 1.0//EN"
+ "http://www.freedesktop.org/standards/dbus/1.0/busconfig.dtd">
+<busconfig>
+  <auth>EXTERNAL</auth>
+  <policy context="default">
+    <allow user="*"/>
+    <allow own="*"/>
+    <allow send_destination="*"/>
+    <allow receive_sender="*"/>
+  </policy>
+  <listen>)" +
+         address + "</listen>\n</busconfig>\n";
 }
 
 /// The trace properties that are texts, as a settings file.
@@ -92,6 +92,20 @@ void writeProcesses(const fs::path& table, const std::vector<std::string>& names
     writeFile(entry / "comm", name.substr(0, kLongestCommandName) + "\n");
     fs::create_symlink("/usr/libexec/" + name, entry / "exe");
   }
+}
+
+/// Packs the directories of a collection, which lie in `folder`, into `archive`.
+bool pack(const fs::path& folder, const std::vector<std::string>& directories,
+          const fs::path& archive) {
+  std::vector<std::string> words = {"tar",
+                                    "--create",
+                                    "--force-local",
+                                    "--auto-compress",
+                                    "--file=" + archive.string(),
+                                    "--directory=" + folder.string()};
+  words.insert(words.end(), directories.begin(), directories.end());
+  const pid_t tar = startChild(words, {}).process;
+  return tar > 0 && awaitChild(tar) == 0;
 }
 
 }  // namespace
@@ -127,20 +141,43 @@ std::string DeviceRoot::busAddress() const {
   return "unix:path=" + escapeForAddress((root / kBusSocket).string());
 }
 
-void DeviceRoot::fill(const Profile& profile) const {
+void DeviceRoot::fill(const Profile& profile) {
+  for (const auto* const directory :
+       {kLogDirectory, kSnapshotDirectory, kDiagDirectory, kQdssDirectory}) {
+    fs::create_directories(root / directory);
+  }
   writeFile(root / kDeviceProfile, profile.text);
   writeFile(root / kBusConfiguration, busConfiguration(busAddress()));
   writeProcesses(root / "proc", profile.processes);
   if (profile.savedTraces) {
-    writeFile(root / kSavedTraces, savedTraces(profile));
+    writeFile(root / "var/lib/vell/traces.conf", savedTraces(profile));
   }
-  fs::create_directories(root / kRequestLogDirectory);
-  fs::create_directories(root / kSnapshotDirectory);
-  for (const auto* const directory : kScratchDirectories) {
-    fs::create_directories(root / directory);
+  const auto pipe = root / "run/manager.control";
+  if (mkfifo(pipe.c_str(), S_IRUSR | S_IWUSR) == 0) {
+    control = FileDescriptor(open(pipe.c_str(), O_RDWR | O_CLOEXEC));
   }
-  if (mkfifo((root / kManagerControl).c_str(), S_IRUSR | S_IWUSR) != 0) {
-    throw std::system_error(errno, std::generic_category(), kManagerControl);
+  if (!control) {
+    throw std::system_error(errno, std::generic_category(), pipe);
+  }
+}
+
+bool writeCollection(const fs::path& root, const Collection& collection,
+                     const std::string& contents) {
+  const auto& [directories, archive] = collection;
+  const auto snapshots = root / kSnapshotDirectory;
+  const auto folder = archive.empty() ? snapshots : root / "var/tmp" / archive;
+  try {
+    for (const auto& directory : directories) {
+      writeFile(folder / directory / "request.txt", contents + "\n");
+    }
+    const bool packed = archive.empty() || pack(folder, directories, snapshots / archive);
+    if (!archive.empty()) {
+      fs::remove_all(folder);
+    }
+    return packed;
+  } catch (const std::system_error& error) {
+    complain(std::string("cannot write a collection: ") + error.what());
+    return false;
   }
 }
 

@@ -97,20 +97,10 @@ int serve(const Words& words) {
   return openLog(words.size() == 2 ? words.back() : "") ? service->second() : EXIT_FAILURE;
 }
 
-/// Runs a command, by default the user's shell, in the device of the profile at `profilePath`.
-int runDevice(const std::string& profilePath, Words command) {
-  if (command.empty()) {
-    const char* shell = std::getenv("SHELL");
-    command = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
-  }
-  blockDeviceSignals();
-  const auto profile = readProfile(profilePath);
-  const auto root = profile ? DeviceRoot::create(*profile) : nullptr;
-  if (!root) {
-    return EXIT_FAILURE;
-  }
-  Device device(*root);
-  return device.start(*profile) ? device.run(command) : EXIT_FAILURE;
+/// The user's shell.
+Words defaultCommand() {
+  const char* shell = std::getenv("SHELL");
+  return {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
 }
 
 int run(const Words& words) {
@@ -129,8 +119,12 @@ int run(const Words& words) {
   if (hasCommand && std::next(separator) == words.end()) {
     return refuse("no command after --");
   }
-  return runDevice(hasProfile ? words.front() : "",
-                   {hasCommand ? std::next(separator) : separator, words.end()});
+  const auto profile = readProfile(hasProfile ? words.front() : "");
+  if (!profile) {
+    return EXIT_FAILURE;
+  }
+  return runOnDevice(*profile,
+                     hasCommand ? Words(std::next(separator), words.end()) : defaultCommand());
 }
 
 }  // namespace

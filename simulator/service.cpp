@@ -5,8 +5,8 @@
 #include "platform/manager_names.h"
 #include "platform/portable/handle.h"
 #include "simulator/answer.h"
-#include "simulator/collection_writer.h"
 #include "simulator/complaint.h"
+#include "simulator/device_root.h"
 #include "simulator/request_text.h"
 
 #include <sys/epoll.h>
