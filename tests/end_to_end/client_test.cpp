@@ -3,8 +3,6 @@
 #include "platform/bus/bus_answer.h"
 #include "platform/bus/bus_connection.h"
 #include "platform/bus/bus_handles.h"
-#include "platform/helper_client.h"
-#include "platform/helper_names.h"
 #include "platform/manager_client.h"
 #include "platform/manager_names.h"
 #include "tests/end_to_end/simulated_device.h"
@@ -246,22 +244,4 @@ TEST_F(Client, FailsOutstandingRequestsWhenReleased) {
   auto answer = startToAsk();
   manager.reset();
   EXPECT_EQ(answer.get(), kStatusBusFailure);
-}
-
-TEST_F(Client, WaitsForTheHelperWithinItsTimeLimit) {
-  start("HELPER_TIMESTAMP=H\nHELPER_ANSWER=slow:300");
-  for (const std::int64_t milliseconds : {60000, 10, 0, -1}) {
-    MessageDict request;
-    request.set(vell::helper::kKeyTimeout, milliseconds);
-    MessageDict reply;
-    SCOPED_TRACE(milliseconds);
-    const auto start = std::chrono::steady_clock::now();
-    const auto result = vell::HelperClient::create("test", nullptr)
-                            ->perform(4, vell::helper::kCommandTidewellStatus, request, reply);
-    const auto taken = std::chrono::steady_clock::now() - start;
-    const bool patient = milliseconds == 60000;
-    EXPECT_EQ(result.status == 0, patient);
-    EXPECT_EQ(taken >= std::chrono::milliseconds(300), patient);
-    EXPECT_EQ(reply.getString(vell::helper::kKeyTimestampString), patient ? "H" : "");
-  }
 }

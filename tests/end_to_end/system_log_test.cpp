@@ -55,12 +55,13 @@ TEST(SystemLog, TakesTheFaultsOfSettingsOnce) {
       {R"(rm "$1" && mkfifo "$1")",
        "'velltool' is not supported on this product.\n",
        {profile + ": not a file"}},
-      {R"(rm "$1" && printf 'RADIO_TYPE=1\nPRODUCT_CODE=many\n\nnonsense\nCARRIER_BUILD="
-             RADIO_VENDOR=99999999999\nRADIO_DIAG_QDSS=YES\nDEFAULT_COMPRESSION=zip' >"$1")",
+      {R"(rm "$1" && printf 'RADIO_TYPE=1\nPRODUCT_CODE="\\" \\$ \\` \\\\ \\x"\n\nnonsense\nCARRIER_BUILD="
+             RADIO_VENDOR=99999999999\nRADIO_DIAG_QDSS=YES\nDEFAULT_COMPRESSION=zip \r\nA B=1\n=1\n \t# A\n' >"$1")",
        kPrompt + failure + kPrompt + failure + kPrompt,
        {profile + ":4: not a KEY=value line",
         profile + ":5: CARRIER_BUILD: value is not quoted as it must be",
-        profile + ":2: PRODUCT_CODE: 'many' is not an integer",
+        profile + ":9: not a KEY=value line", profile + ":10: not a KEY=value line",
+        profile + R"(:2: PRODUCT_CODE: '" $ ` \ \x' is not an integer)",
         profile + ":6: RADIO_VENDOR: '99999999999' is not an integer",
         profile + ":7: RADIO_DIAG_QDSS: 'YES' is not yes or no",
         profile + ":8: DEFAULT_COMPRESSION: 'zip' is not nocompress, tar.gz, tar or an integer"}},

@@ -11,9 +11,11 @@
 
 TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
   in_process::device.programName = "mytool";
-  const Console console("cd logdump\nquit\n");
+  const Console console("cd logdump\nbb\nquit\n");
   EXPECT_TRUE(VellShell().run({"/opt/other"}));
-  EXPECT_EQ(console.output(), "(/mytool)>> (/mytool/logdump)>> ");
+  EXPECT_EQ(console.output(),
+            "(/mytool)>> (/mytool/logdump)>> Baseband logs are not enabled\n"
+            "(/mytool/logdump)>> ");
   EXPECT_EQ(in_process::device.clientCalls,
             (std::vector<std::string>{"CreateManager velltool velltool.queue",
                                       "RegisterEventHandler ServerStateChange", "EventsOff",
@@ -28,8 +30,14 @@ TEST(VellShell, FollowsTheManagerBeforeItPromptsUnderTheProgramsName) {
       {"no key", event("State", "Started")},
       {"another type", event(vell::kKeyServerState, true)},
       {"another state", event(vell::kKeyServerState, "started")}};
+  // Of two values of a key the later one counts.
+  const auto started = MessageDict::fromEntries({{"a", true},
+                                                 {"a", false},
+                                                 {vell::kKeyServerState, false},
+                                                 {vell::kKeyServerState, "Started"}});
+  EXPECT_EQ(started.entries().size(), 2U);
   for (const auto& [other, payload] : others) {
-    in_process::device.eventHandler(event(vell::kKeyServerState, "Started"), {});
+    in_process::device.eventHandler(started, {});
     EXPECT_TRUE(IsServerRunning()) << other;
     in_process::device.eventHandler(payload, {});
     EXPECT_FALSE(IsServerRunning()) << other;

@@ -1,5 +1,3 @@
-#include "platform/text.h"
-
 #include "platform/unicode/utf8.h"
 
 #include <gtest/gtest.h>
@@ -23,9 +21,4 @@ TEST(Utf8, ReplacesForInterchangeWhatNotEveryProgramTakes) {
       interchangeText(std::string("a\0\xFF|\uFDCF\uFDD0\uFDEF\uFDF0|\uFFFD\uFFFE\uFFFF|", 27) +
                       "\U0001FFFD\U0010FFFF"),
       "a\uFFFD\uFFFD|\uFDCF\uFFFD\uFFFD\uFDF0|\uFFFD\uFFFD\uFFFD|\U0001FFFD\uFFFD");
-}
-
-TEST(Text, ComparesWithoutTheCaseOfAsciiLettersAlone) {
-  EXPECT_TRUE(equalNoCase("Az.\xC3\x84", "aZ.\xC3\x84"));
-  EXPECT_FALSE(equalNoCase("[", "{") || equalNoCase("\xC3\x84", "\xC3\xA4"));
 }
