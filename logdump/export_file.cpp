@@ -9,7 +9,7 @@ ExportFile::ExportFile(std::string filePath, std::unique_ptr<WritableFile> opene
 
 bool ExportFile::append(std::string_view line) {
   const std::lock_guard lock(mutex);
-  if (file == nullptr) {
+  if (closed || file == nullptr) {
     return true;
   }
   const auto error = file->append(line);
@@ -23,7 +23,11 @@ bool ExportFile::append(std::string_view line) {
 }
 
 bool ExportFile::close() {
-  const std::lock_guard lock(mutex);
+  closed = true;
+  const std::unique_lock lock(mutex, std::try_to_lock);
+  if (!lock) {
+    return false;
+  }
   file.reset();
   return !failed;
 }

@@ -2,6 +2,7 @@
 
 #include "platform/files.h"
 
+#include <atomic>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -17,11 +18,13 @@ class ExportFile {
   /// failed before. Returns false when this is the write that fails; that is told the system log.
   bool append(std::string_view line);
 
-  /// Closes the file, after a write that is under way. Returns whether every line was written.
+  /// Closes the file; one under a write, which may never return, when this object goes. Nothing
+  /// more is written. Returns whether every line was written.
   bool close();
 
  private:
   const std::string path;
+  std::atomic<bool> closed = false;  ///< Set while a write may be under way.
   std::mutex mutex;
   std::unique_ptr<WritableFile> file;  ///< Guarded by `mutex`; null once closed or failed.
   bool failed = false;                 ///< Guarded by `mutex`.

@@ -1,10 +1,13 @@
 #include "logdump/os_log_stream.h"
 
+#include "logdump/export_file.h"
 #include "tests/in_process/log_device.h"
 
 #include <gtest/gtest.h>
 
+#include <future>
 #include <string>
+#include <thread>
 #include <tuple>
 #include <vector>
 
@@ -70,4 +73,29 @@ TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
   EXPECT_EQ(logDevice.filter, std::nullopt);
   EXPECT_EQ(logDevice.from, logDevice.now - std::chrono::hours(1));
   EXPECT_EQ(logDevice.longestWait, std::chrono::seconds(180));
+}
+
+TEST(ExportFile, StaysOpenUnderAWriteThatHangsAndTakesNoOther) {
+  static std::promise<void> begun;
+  static std::promise<void> released;
+  static int closed = 0;
+  struct HangingFile : WritableFile {
+    ~HangingFile() override { ++closed; }
+    std::error_code append(std::string_view /*bytes*/) override {
+      begun.set_value();  // Throws the second time.
+      released.get_future().wait();
+      return {};
+    }
+  };
+  {
+    ExportFile file("hangs", std::make_unique<HangingFile>());
+    std::thread writing([&] { EXPECT_TRUE(file.append("one")); });
+    begun.get_future().wait();
+    EXPECT_FALSE(file.close());
+    EXPECT_EQ(closed, 0);
+    released.set_value();
+    writing.join();
+    EXPECT_TRUE(file.append("two"));
+  }
+  EXPECT_EQ(closed, 1);
 }
