@@ -5,10 +5,10 @@
 const char* getprogname();
 
 /// Opens the null device in place of each standard stream that the process was started without, so
-/// that nothing else comes to stand there; see null(4). Has std::cout and std::cerr wait for room
-/// where they lead to a pipe or terminal that does not block, so that they fail only when what is
-/// behind them cannot be written to; each is then for one thread at a time. Called first of all, on
-/// the main thread.
+/// that nothing else comes to stand there, see null(4), and ends the process when it cannot. Has
+/// std::cin wait for input, and std::cout and std::cerr for room, where they lead to something that
+/// does not block, so that they fail only when what is behind them does; each is then for one
+/// thread at a time. Called first of all, on the main thread.
 void prepareStandardStreams();
 
 /// Keeps the calling thread, which is the main thread, in service of the platform for the rest of

@@ -8,6 +8,7 @@ struct LogContext {
   std::string category;   ///< The part of the product.
 };
 
-/// Writes one message to the system log, at the level of errors. A message that
-/// cannot be written is dropped, because there is nowhere else to say so.
+/// Writes one message to the system log, at the level of errors. A message that cannot be written
+/// is dropped, because there is nowhere else to say so. Ends the process when no file descriptor is
+/// left to write it.
 void logSystemError(const std::string& message);

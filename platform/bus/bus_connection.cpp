@@ -225,10 +225,6 @@ BusConnection::Clock::time_point BusConnection::wakeTime() const {
     return nextAttempt;
   }
   auto earliest = ready ? Clock::time_point::max() : greetingLimit;
-  if (wakeUp.descriptor() < 0) {
-    // Nothing can wake the thread, so it polls.
-    earliest = std::min(earliest, Clock::now() + kRetryPause);
-  }
   std::uint64_t busLimit = UINT64_MAX;
   if (sd_bus_get_timeout(bus.get(), &busLimit) >= 0 && busLimit != UINT64_MAX) {
     const std::chrono::microseconds sinceBoot(busLimit);

@@ -46,8 +46,8 @@ void take(SettingsFile& file, const char* key, const char* expected, Value& memb
   if (read(found->second.value, value)) {
     member = value;
   } else {
-    file.faults.push_back({found->second.line, std::string(key) + ": '" + found->second.value +
-                                                   "' is not " + expected});
+    file.addFault(found->second.line,
+                  std::string(key) + ": '" + found->second.value + "' is not " + expected);
   }
 }
 

@@ -1,8 +1,9 @@
 #include "platform/device/sysroot.h"
+#include "platform/posix/read_file.h"
+#include "platform/process_end.h"
 #include "platform/telephony.h"
 
 #include <filesystem>
-#include <fstream>
 #include <system_error>
 
 namespace {
@@ -16,13 +17,15 @@ bool isProcessFolder(const fs::path& path) {
 
 /// A process may end while it is looked at: what can no longer be read then does not match.
 bool isNamed(const fs::path& process, const std::string& name) {
-  std::ifstream comm(process / "comm");
+  constexpr std::size_t kLongestCommand = 16;  // With its line break, see proc(5).
   std::string command;
-  if (std::getline(comm, command) && command == name) {
+  if (readRegularFile(process / "comm", kLongestCommand, command) == 0 &&
+      command.substr(0, command.find('\n')) == name) {
     return true;
   }
   std::error_code error;
   const auto executable = fs::read_symlink(process / "exe", error);
+  endIfScarce(error.value());
   return !error && executable.filename() == name;
 }
 
@@ -36,5 +39,6 @@ bool processRunning(const std::string& name) {
       return true;
     }
   }
+  endIfScarce(error.value());
   return false;
 }

@@ -1,12 +1,11 @@
 #include "platform/device/settings_file.h"
 
+#include "platform/posix/read_file.h"
+
 #include <cerrno>
 #include <cstring>
-#include <fstream>
-#include <iterator>
 #include <sstream>
 #include <string_view>
-#include <system_error>
 #include <utility>
 
 namespace {
@@ -66,12 +65,12 @@ void parseLine(std::string_view text, int line, SettingsFile& file) {
   const auto equals = text.find('=');
   const auto key = text.substr(0, equals);
   if (equals == std::string_view::npos || !isKey(key)) {
-    file.faults.push_back({line, "not a KEY=value line"});
+    file.addFault(line, "not a KEY=value line");
     return;
   }
   auto value = readValue(text.substr(equals + 1));
   if (!value) {
-    file.faults.push_back({line, std::string(key) + ": value is not quoted as it must be"});
+    file.addFault(line, std::string(key) + ": value is not quoted as it must be");
     file.settings.erase(std::string(key));
     return;
   }
@@ -91,29 +90,28 @@ SettingsFile SettingsFile::parse(const std::string& text) {
 }
 
 std::optional<SettingsFile> SettingsFile::read(const std::filesystem::path& path) {
-  const auto unreadable = [](const char* why) {
-    SettingsFile file;
-    file.faults.push_back({0, why});
-    return file;
-  };
-  std::error_code error;
-  const auto status = std::filesystem::status(path, error);
-  if (status.type() == std::filesystem::file_type::not_found) {
+  constexpr std::size_t kLargest = 1024UL * 1024;
+  std::string text;
+  const int error = readRegularFile(path, kLargest + 1, text);
+  if (error == ENOENT || error == ENOTDIR) {
     return std::nullopt;
   }
-  // Anything else than a file might never come to its end.
-  if (std::filesystem::exists(status) && !std::filesystem::is_regular_file(status)) {
-    return unreadable("not a file");
+  if (error == 0 && text.size() <= kLargest) {
+    return parse(text);
   }
-  const std::ifstream stream(path, std::ios::binary);
-  if (!stream) {
-    return unreadable(std::strerror(errno));
+  SettingsFile file;
+  file.addFault(0, error == 0        ? "larger than 1 MiB"
+                   : error == EINVAL ? "not a file"
+                                     : std::strerror(error));
+  return file;
+}
+
+void SettingsFile::addFault(int line, std::string what) {
+  constexpr std::size_t kMostTold = 20;
+  if (++faultCount > kMostTold) {
+    faults.resize(kMostTold);
+    line = 0;
+    what = std::to_string(faultCount) + " faults in all";
   }
-  std::ostringstream text;
-  errno = 0;
-  text << stream.rdbuf();
-  if (errno != 0) {
-    return unreadable(std::strerror(errno));
-  }
-  return parse(text.str());
+  faults.push_back({line, std::move(what)});
 }

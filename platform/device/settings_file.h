@@ -23,15 +23,21 @@ struct SettingsFile {
   };
 
   std::map<std::string, Setting> settings;
-  std::vector<Fault> faults;
+  std::vector<Fault> faults;  ///< The first twenty; if there are more, their number behind them.
+
+  /// Notes a fault.
+  void addFault(int line, std::string what);
 
   /// Reads the file at `path`. Empty when there is no such file; one that is there and cannot be
-  /// read gives a fault and no settings, a line that cannot be read gives a fault and is passed
-  /// over.
+  /// read, or is larger than 1 MiB, gives a fault and no settings, a line that cannot be read gives
+  /// a fault and is passed over.
   static std::optional<SettingsFile> read(const std::filesystem::path& path);
 
   /// As `read`, from a text.
   static SettingsFile parse(const std::string& text);
+
+ private:
+  std::size_t faultCount = 0;
 };
 
 /// Says each of `faults` in the system log, with file and line.

@@ -3,6 +3,7 @@
 #include "platform/device/sysroot.h"
 #include "platform/posix/file_descriptor.h"
 #include "platform/posix/whole_write.h"
+#include "platform/process_end.h"
 
 #include <endian.h>
 #include <fcntl.h>
@@ -43,6 +44,9 @@ std::string nativeEntry(const std::string& message) {
 FileDescriptor sealedFile(const std::string& bytes) {
   constexpr int kAllSeals = F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE | F_SEAL_SEAL;
   FileDescriptor file(memfd_create("journal-entry", MFD_CLOEXEC | MFD_ALLOW_SEALING));
+  if (!file) {
+    endIfScarce(errno);
+  }
   if (!file || writeWhole(file.get(), bytes) || fcntl(file.get(), F_ADD_SEALS, kAllSeals) != 0) {
     return FileDescriptor();
   }
@@ -71,6 +75,9 @@ int sendPatiently(int sender, const msghdr& datagram) {
 /// a file.
 void sendEntry(sockaddr_un& address, std::string& entry) {
   const FileDescriptor sender(socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+  if (!sender) {
+    endIfScarce(errno);
+  }
   iovec bytes{entry.data(), entry.size()};
   msghdr datagram{};
   datagram.msg_name = &address;
@@ -101,6 +108,7 @@ void logSystemError(const std::string& message) {
   const auto directory = sysroot() / "run/systemd/journal";
   const FileDescriptor folder(open(directory.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
   if (!folder) {
+    endIfScarce(errno);
     return;
   }
   sockaddr_un address{};

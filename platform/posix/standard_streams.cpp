@@ -1,9 +1,13 @@
 #include "platform/posix/whole_write.h"
+#include "platform/process_end.h"
 #include "platform/program.h"
 
 #include <fcntl.h>
+#include <poll.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <cerrno>
 #include <initializer_list>
 #include <iostream>
 #include <streambuf>
@@ -15,7 +19,9 @@ void openMissingStreams() {
   for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
     if (fcntl(stream, F_GETFD) < 0) {
       // The lowest free number is this one. What it is opened for is what it is there for.
-      static_cast<void>(open("/dev/null", stream == STDIN_FILENO ? O_RDONLY : O_WRONLY));
+      if (open("/dev/null", stream == STDIN_FILENO ? O_RDONLY : O_WRONLY) < 0) {
+        endProcess("cannot open /dev/null", errno);
+      }
     }
   }
 }
@@ -44,11 +50,30 @@ class DescriptorBuffer : public std::streambuf {
   std::string unwritten;
 };
 
+/// Reads standard input byte by byte, so that what is behind a line is left to whoever reads next.
+/// Waits where it does not block.
+class InputBuffer : public std::streambuf {
+ protected:
+  int_type underflow() override {
+    ssize_t count = read(STDIN_FILENO, &byte, 1);
+    for (; count < 0 && (errno == EAGAIN || errno == EINTR); count = read(STDIN_FILENO, &byte, 1)) {
+      pollfd waiting{STDIN_FILENO, POLLIN, 0};
+      poll(&waiting, 1, -1);
+    }
+    setg(&byte, &byte, &byte + std::max<ssize_t>(count, 0));
+    return count > 0 ? traits_type::to_int_type(byte) : traits_type::eof();
+  }
+
+ private:
+  char byte = 0;
+};
+
 }  // namespace
 
 void prepareStandardStreams() {
   openMissingStreams();
-  // Never destroyed: the process flushes both when it exits.
+  // Never destroyed: the process may still use them when it exits.
+  std::cin.rdbuf(new InputBuffer);
   std::cout.rdbuf(new DescriptorBuffer(STDOUT_FILENO));
   std::cerr.rdbuf(new DescriptorBuffer(STDERR_FILENO));
 }

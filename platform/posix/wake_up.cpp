@@ -1,8 +1,16 @@
 #include "platform/posix/wake_up.h"
 
+#include "platform/process_end.h"
+
 #include <sys/eventfd.h>
 
-WakeUp::WakeUp() : event(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)) {}
+#include <cerrno>
+
+WakeUp::WakeUp() : event(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)) {
+  if (!event) {
+    endProcess("cannot wait for events", errno);
+  }
+}
 
 void WakeUp::signal() const {
   static_cast<void>(eventfd_write(event.get(), 1));

@@ -18,10 +18,10 @@ TEST(SystemLog, TakesLongMessagesWholeAndHoldsTheToolUpForASecondInAll) {
   const auto* onMachine = R"(exec unshare -rm sh -c 'cd "$VELL_SYSROOT" && mount --bind etc /etc &&
       mount --bind run /run && unset VELL_SYSROOT && exec "$0" help' "$0")";
   const std::string value(1'000'000, 'x');
-  std::string manyFaults = "RADIO_TYPE=1\nPRODUCT_CODE=58\n";
-  for (int times = 0; times < 1000; ++times) {
-    manyFaults += "nonsense\n";
-  }
+  const auto* fill = R"(cd "$VELL_SYSROOT"; python3 -c 'from socket import *
+log = socket(AF_UNIX, SOCK_DGRAM)
+log.connect("run/systemd/journal/socket")
+while True: log.send(b"PRIORITY=3\nMESSAGE=full\n", MSG_DONTWAIT)')";
   SystemLogSocket log(device.root());
   for (const auto& [line, path] :
        {std::pair(R"(exec "$0" help)", (device.root() / "etc/vell/device.conf").string()),
@@ -36,11 +36,12 @@ TEST(SystemLog, TakesLongMessagesWholeAndHoldsTheToolUpForASecondInAll) {
 
     // Nobody takes these away.
     const auto start = std::chrono::steady_clock::now();
-    EXPECT_EQ(helpWith(line, manyFaults), 0);
+    EXPECT_EQ(device.runLine(fill).status, 1);
+    EXPECT_EQ(helpWith(line, "RADIO_TYPE=1\nPRODUCT_CODE=58\nnonsense\nnonsense\n"), 0);
     const auto taken = std::chrono::steady_clock::now() - start;
     EXPECT_GE(taken, std::chrono::seconds(1));
     EXPECT_LT(taken, std::chrono::seconds(10));
-    EXPECT_EQ(log.messages().at(1), path + ":4: not a KEY=value line");
+    EXPECT_EQ(log.messages().back(), "full");
   }
 }
 
@@ -68,6 +69,9 @@ TEST(SystemLog, TakesTheFaultsOfSettingsOnce) {
       {R"(echo RADIO_TYPE=1 >"$1" && printf "Baseband.TraceEnabled 'yes'\nnonsense" >"$2")",
        kPrompt + failure + kPrompt + failure + kPrompt,
        {traces + ":1: not a KEY=value line", traces + ":2: not a KEY=value line"}},
+      {R"(truncate -s 1048577 "$2")",
+       kPrompt + failure + kPrompt + failure + kPrompt,
+       {traces + ": larger than 1 MiB"}},
       {R"(rm "$2" && mkdir "$2")",
        kPrompt + failure + kPrompt + failure + kPrompt,
        {traces + ": not a file"}}};
