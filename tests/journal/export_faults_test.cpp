@@ -131,7 +131,7 @@ TEST(ExportFailures, GiveUpTheOldestOfMoreFilesThanCanBeOpen) {
             "first " + all.substr(all.find("11 ")) + "last " + kAll +
                 "descriptors descriptors descriptors descriptors descriptors 1 ");
   // Not even the journals can be found.
-  EXPECT_EQ(device.run({"-p"}, "ulimit -n 4;"),
+  EXPECT_EQ(device.run({"-p"}, "rm out.txt; ulimit -n 5;"),
             "velltool: cannot open a file: Too many open files\nstatus 1\n");
   // Files that end before the history are not kept open.
   EXPECT_EQ(lastWords(device.run({"-p"}, "H=9000; ulimit -n 24;")), "2 1 last 9000.000000 ");
