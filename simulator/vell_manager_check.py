@@ -306,7 +306,7 @@ def run():
                      "The value is one of these words, in any letter case, or a number"):
             status, value = manager.ask(name).status("TracePropertyValue")
             expect(name != ENABLED or value is not None, f"status {status} and no value")
-            expect(value is None or number(value) is not None, f"the value {value}")
+            expect(value is None or number(value) is not None, f"the value '{value}'")
             manager.properties[name] = value
     with promise("what is unknown is answered", members, "Answer each command, also one that you do not know"):
         for call in (manager.ask("Baseband.NoSuchProperty"), manager.ask("NoSuchTrace.TraceEnabled"),
