@@ -20,6 +20,7 @@
 #include <iterator>
 #include <map>
 #include <optional>
+#include <system_error>
 
 namespace simulator {
 
@@ -131,7 +132,12 @@ class Device {
 
  private:
   bool startService(const std::string& name) {
-    const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
+    std::error_code error;
+    const auto self = std::filesystem::read_symlink("/proc/self/exe", error).string();
+    if (error) {
+      complain("/proc/self/exe: " + error.message());
+      return false;
+    }
     const auto log = root.path() / kLogDirectory / (name + ".log");
     const auto child = startChild(
         {self, "--serve", name, log.string()},
