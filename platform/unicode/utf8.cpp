@@ -96,6 +96,21 @@ std::string validUtf8(std::string_view bytes) {
   return text;
 }
 
+std::string takeUtf8(std::string& bytes) {
+  std::string_view rest = bytes;
+  const auto isBegun = [&] {
+    const auto lead = static_cast<unsigned char>(rest.front());
+    return lead >= 0xC2 && lead <= 0xF4 && brokenLength(rest) == rest.size();
+  };
+  for (rest.remove_prefix(validLength(rest)); !rest.empty() && !isBegun();
+       rest.remove_prefix(validLength(rest))) {
+    rest.remove_prefix(brokenLength(rest));
+  }
+  auto text = validUtf8(bytes.substr(0, bytes.size() - rest.size()));
+  bytes = rest;
+  return text;
+}
+
 std::string interchangeText(std::string_view bytes) {
   const auto valid = validUtf8(bytes);
   std::string text;
