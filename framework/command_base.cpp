@@ -43,6 +43,10 @@ void CommandBase::addCommandHandler(std::string word, CommandHandler handler, st
   }
 }
 
+void CommandBase::addWordCompleter(std::string word, WordCompleter completer) {
+  completers[word] = std::move(completer);
+}
+
 void CommandBase::addSubCommand(std::string word, std::shared_ptr<CommandBase> child) {
   if (child) {
     subCommands[word] = std::move(child);
@@ -68,6 +72,13 @@ std::set<std::string> CommandBase::getWords() const {
   std::for_each(handlers.begin(), handlers.end(), add);
   std::for_each(subCommands.begin(), subCommands.end(), add);
   return words;
+}
+
+std::set<std::string> CommandBase::completeWord(const std::string& word,
+                                                const std::list<std::string>& before,
+                                                const std::string& typed) const {
+  const auto found = completers.find(word);
+  return found == completers.end() ? std::set<std::string>() : found->second(before, typed);
 }
 
 std::string CommandBase::getHierarchy() const {

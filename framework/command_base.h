@@ -14,6 +14,12 @@
 /// Its result is the command's result. It runs on the shell thread.
 using CommandHandler = std::function<bool(WorkGroup group, std::list<std::string> args)>;
 
+/// Gives the words that can stand behind a handler's where one has been begun with `typed`,
+/// `before` being those in between. A word that ends with a slash may go on behind it. On the shell
+/// thread.
+using WordCompleter = std::function<std::set<std::string>(const std::list<std::string>& before,
+                                                          const std::string& typed)>;
+
 /// A node of the command tree: a named group of handlers and of deeper nodes.
 ///
 /// A node is made in two steps by its class's static `create`: constructed and handed to a
@@ -46,6 +52,10 @@ class CommandBase : public std::enable_shared_from_this<CommandBase> {
   /// An empty help text leaves an earlier one as it is. An empty handler registers nothing.
   void addCommandHandler(std::string word, CommandHandler handler, std::string help);
 
+  /// Registers what completes the words behind the handler's word `word`, in place of an earlier
+  /// one.
+  void addWordCompleter(std::string word, WordCompleter completer);
+
   /// Registers `child`, which is initialised already, under `word`, in place of an earlier one. An
   /// empty child registers nothing.
   void addSubCommand(std::string word, std::shared_ptr<CommandBase> child);
@@ -61,6 +71,10 @@ class CommandBase : public std::enable_shared_from_this<CommandBase> {
 
   /// The words of all handlers and children.
   std::set<std::string> getWords() const;
+
+  /// What the completer registered under `word` gives; nothing without one.
+  std::set<std::string> completeWord(const std::string& word, const std::list<std::string>& before,
+                                     const std::string& typed) const;
 
   /// The names from the root to this node, each after a "/"; empty before `init`.
   std::string getHierarchy() const;
@@ -85,5 +99,6 @@ class CommandBase : public std::enable_shared_from_this<CommandBase> {
   std::string hierarchyPath;
   std::map<std::string, CommandHandler> handlers;
   std::map<std::string, std::string> helpTexts;
+  std::map<std::string, WordCompleter> completers;
   std::map<std::string, std::shared_ptr<CommandBase>> subCommands;
 };

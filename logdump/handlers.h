@@ -24,3 +24,6 @@ CommandHandler makeBasebandLogsHandler(LogdumpCommand& node);
 /// select; without those, the daemons of the telephony, baseband and power side are selected. Its
 /// result is the export's, or false when the first two words are missing.
 CommandHandler makeOsLogHandler();
+
+/// Completes the words of "oslog": files, options, and behind "-p" the names of processes that run.
+WordCompleter makeOsLogCompleter();

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "framework/command_base.h"
 #include "platform/compression.h"
 
 #include <list>
@@ -11,6 +12,10 @@
 /// always set. `args` is consumed from the front. On the shell thread.
 void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::string& reason,
                       bool& nonui);
+
+/// Completes those words: with keywords, "nonui" among them where it counts, and with "--". On the
+/// shell thread.
+WordCompleter completeLogdumpArgs(bool nonui);
 
 /// What the user asked of a collection.
 struct LogdumpOptions {

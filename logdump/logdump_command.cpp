@@ -1,6 +1,7 @@
 #include "logdump/logdump_command.h"
 
 #include "logdump/handlers.h"
+#include "logdump/logdump_args.h"
 #include "tool/server_state.h"
 
 #include <iostream>
@@ -31,9 +32,13 @@ void LogdumpCommand::registerCommands() {
       "[nocompress|tar.gz|tar] [nonui] <reason> collect telephony logs with coredump");
   addCommandHandler("bb", makeBasebandLogsHandler(*this),
                     "[nocompress|tar.gz|tar] <reason> collect baseband logs only");
+  addWordCompleter("tel", completeLogdumpArgs(true));
+  addWordCompleter("core", completeLogdumpArgs(true));
+  addWordCompleter("bb", completeLogdumpArgs(false));
   addCommandHandler("oslog", makeOsLogHandler(),
                     "[history size] [output txt file path] -p <process1 process2..> "
                     "-i <imagePath1 imagePath2..> collect oslog to txt");
+  addWordCompleter("oslog", makeOsLogCompleter());
 }
 
 bool LogdumpCommand::isAllowed(std::string word) {

@@ -1,16 +1,25 @@
 #include "logdump/handlers.h"
 #include "logdump/os_log_stream.h"
+#include "platform/telephony.h"
 
 #include <algorithm>
 #include <cstdlib>
+#include <filesystem>
 #include <iostream>
+#include <iterator>
 #include <limits>
 #include <optional>
+#include <set>
 #include <string>
+#include <system_error>
 #include <utility>
 #include <vector>
 
 namespace {
+
+namespace fs = std::filesystem;
+
+constexpr std::size_t kFewestWords = 2;
 
 struct Selection {
   std::vector<std::string> processes;
@@ -54,7 +63,6 @@ std::string takeFirst(std::list<std::string>& words) {
 }
 
 bool exportOsLog(std::list<std::string> words) {
-  constexpr std::size_t kFewestWords = 2;
   if (words.size() < kFewestWords) {
     std::cout << "os log collection: Failed" << std::endl;
     return false;
@@ -66,7 +74,39 @@ bool exportOsLog(std::list<std::string> words) {
                                            std::move(selection.imagePaths), history);
 }
 
+/// The paths of files that begin with `typed`; a slash ends that of a folder.
+std::set<std::string> filesAt(const std::string& typed) {
+  const auto folder = typed.substr(0, typed.rfind('/') + 1);
+  std::set<std::string> files;
+  std::error_code error;
+  for (fs::directory_iterator entry(folder.empty() ? "." : folder, error), end;
+       !error && entry != end; entry.increment(error)) {
+    const auto name = entry->path().filename().string();
+    std::error_code unknown;
+    if (!name.starts_with('.') || typed.size() > folder.size()) {
+      files.insert(folder + name + (entry->is_directory(unknown) ? "/" : ""));
+    }
+  }
+  return files;
+}
+
 }  // namespace
+
+WordCompleter makeOsLogCompleter() {
+  return [](const std::list<std::string>& before, const std::string& typed) {
+    if (before.size() < kFewestWords) {
+      return before.empty() ? std::set<std::string>() : filesAt(typed);
+    }
+    std::string option;
+    for (auto word = std::next(before.begin(), kFewestWords); word != before.end(); ++word) {
+      option = word->starts_with('-') ? *word : option;
+    }
+    if (typed.starts_with('-') || (option != "-p" && option != "-i")) {
+      return std::set<std::string>{"--", "-i", "-p"};
+    }
+    return option == "-p" ? processNames() : filesAt(typed);
+  };
+}
 
 CommandHandler makeOsLogHandler() {
   return [](WorkGroup group, std::list<std::string> args) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <set>
 #include <string>
 
 /// What the device says of its radio, its build and its processes. The answers of the device
@@ -26,3 +27,6 @@ bool isCarrierBuild();
 /// Whether a process runs whose command name, or the last component of whose executable, is exactly
 /// `name`. The process table is read at each call; see proc(5).
 bool processRunning(const std::string& name);
+
+/// The names for which `processRunning` is true, without the beginnings of longer names.
+std::set<std::string> processNames();

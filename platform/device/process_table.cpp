@@ -3,8 +3,11 @@
 #include "platform/process_end.h"
 #include "platform/telephony.h"
 
+#include <algorithm>
 #include <filesystem>
+#include <string>
 #include <system_error>
+#include <vector>
 
 namespace {
 
@@ -15,30 +18,53 @@ bool isProcessFolder(const fs::path& path) {
   return !name.empty() && name.find_first_not_of("0123456789") == std::string::npos;
 }
 
-/// A process may end while it is looked at: what can no longer be read then does not match.
-bool isNamed(const fs::path& process, const std::string& name) {
-  constexpr std::size_t kLongestCommand = 16;  // With its line break, see proc(5).
-  std::string command;
-  if (readRegularFile(process / "comm", kLongestCommand, command) == 0 &&
-      command.substr(0, command.find('\n')) == name) {
-    return true;
-  }
+struct Process {
+  std::string command;     ///< Cut at 15 bytes, see proc(5).
+  std::string executable;  ///< The last component of its path.
+};
+
+/// A process may end while it is looked at: what can no longer be read then is empty.
+Process lookAt(const fs::path& folder) {
+  constexpr std::size_t kLongestCommand = 16;  // With its line break.
+  Process process;
+  readRegularFile(folder / "comm", kLongestCommand, process.command);
+  process.command.erase(std::min(process.command.find('\n'), process.command.size()));
   std::error_code error;
-  const auto executable = fs::read_symlink(process / "exe", error);
+  process.executable = fs::read_symlink(folder / "exe", error).filename();
   endIfScarce(error.value());
-  return !error && executable.filename() == name;
+  return process;
+}
+
+std::vector<Process> processes() {
+  std::vector<Process> found;
+  std::error_code error;
+  for (fs::directory_iterator entry(sysroot() / "proc", error), end; !error && entry != end;
+       entry.increment(error)) {
+    if (isProcessFolder(entry->path())) {
+      found.push_back(lookAt(entry->path()));
+    }
+  }
+  endIfScarce(error.value());
+  return found;
 }
 
 }  // namespace
 
 bool processRunning(const std::string& name) {
-  std::error_code error;
-  for (fs::directory_iterator entry(sysroot() / "proc", error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (isProcessFolder(entry->path()) && isNamed(entry->path(), name)) {
-      return true;
+  return std::ranges::any_of(processes(), [&](const Process& process) {
+    return process.command == name || process.executable == name;
+  });
+}
+
+std::set<std::string> processNames() {
+  constexpr std::size_t kCutLength = 15;
+  std::set<std::string> names;
+  for (const auto& process : processes()) {
+    names.insert(process.executable);
+    if (process.command.size() < kCutLength) {
+      names.insert(process.command);
     }
   }
-  endIfScarce(error.value());
-  return false;
+  names.erase("");
+  return names;
 }

@@ -17,6 +17,7 @@ bool isInternalBuild() { return false; }
 bool isCarrierBuild() { return false; }
 CompressionMode defaultCompressionMode() { return kCompressionNone; }
 bool compressionSupported() { return true; }
+std::set<std::string> processNames() { return device.processNames; }
 const char* getprogname() { return device.programName.c_str(); }
 
 // clang-format on

@@ -2,6 +2,7 @@
 
 #include "platform/manager_client.h"
 
+#include <set>
 #include <string>
 #include <vector>
 
@@ -13,6 +14,7 @@ struct Device {
   int productCode = 0;
   int radioVendor = 0;
   std::string programName = "velltool";
+  std::set<std::string> processNames;
   std::vector<std::string> clientCalls;     ///< What was done to the client of the manager.
   vell::client::EventHandler eventHandler;  ///< As the client was given it, for events of a test.
 };

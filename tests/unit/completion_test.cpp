@@ -11,6 +11,11 @@ TEST(Completion, OffersWhatTheShellKnows) {
       top.addChild(name, [](PlainNode& node) {
         node.addHandlers({"telx", "tel", "locked", "g\xff"});
         node.addChild("route", [](PlainNode&) {});
+        node.addWordCompleter("tel", [](const auto& before, const std::string& typed) {
+          const auto first = before.empty() ? "" : before.front();
+          return std::set<std::string>{typed + "x/", first + typed, "two words", "\x1b",
+                                       "\u009b2J"};
+        });
       });
     }
   });
@@ -30,11 +35,15 @@ TEST(Completion, OffersWhatTheShellKnows) {
       {"t", "tel -- deep t", "tel  telx  ", 1},
       {"t", "nosuch deep -- ", atRoot + builtIn + "quit  tel  "},
       {"t", "cd ", "both/ deep/ "},
-      {"deep", "cd ", "../ route/ "},
-      {"t", "cd /deep//", "../ route/ "},
+      {"deep", "cd ", "route/ "},
+      {"deep", "cd .", "../ ", 1},
+      {"t", "cd deep/route/", ""},
+      {"t", "cd ../", "both/ deep/ "},
       {"t", "cd deep/../b", "both/ ", 1},
       {"t", "cd deep/nosuch/", ""},
-      {"t", "deep cd ", "../ route/ "},
+      {"t", "deep cd ", "route/ "},
+      {"t", "deep tel a-", "a-  a-x/ ", 2},
+      {"t", "deep tel f/ oo f/o", "ox/ ", 1},
       {"t", "cd deep ", ""},
       {"t", "cd cd ", ""},
   };
