@@ -23,7 +23,7 @@ endfunction()
 vell_find_module(SYSTEMD libsystemd libsystemd-dev)
 vell_find_module(UTF8PROC libutf8proc libutf8proc-dev)
 if(VELL_LINE_EDITING)
-  vell_find_module(LIBEDIT libedit libedit-dev)
+  vell_find_module(READLINE readline libreadline-dev)
 endif()
 vell_find_program(JOURNAL_REMOTE systemd-journal-remote systemd-journal-remote)
 

@@ -19,9 +19,10 @@ using Completer = std::function<Completions(const std::string& text)>;
 /// A line that ends with the input counts. nullopt at the end of input, after an error and when the
 /// prompt cannot be written.
 ///
-/// Where both are terminals that can do it, the line can be edited, the Tab key asks `complete`,
-/// and the process's earlier lines come back: a letter with its accents counts as one, and what is
-/// no UTF-8 is passed over. What is typed between two calls waits unseen for the next. The terminal
-/// is then set as it was found when the process exits (std::exit, std::quick_exit), is stopped from
-/// the keyboard, or ends by a signal that can be caught. All calls are from the same thread.
+/// Where both are terminals that can do it, the line is edited with readline(3), as the person's
+/// inputrc says for "velltool": Tab asks `complete`, the process's earlier lines come back, Ctrl-C
+/// gives up the line and begins another, and what is no UTF-8 is taken for U+FFFD. Several lines
+/// that were entered at once come one by one. During the call the terminal is set for editing; it
+/// is as it was found whenever a signal stops or ends the process, and after std::quick_exit. Other
+/// threads have to block signals. All calls are from the same thread.
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete);

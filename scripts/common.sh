@@ -3,7 +3,7 @@
 set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")/.."
 
-build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev libedit-dev)
+build_packages=(g++ cmake ninja-build pkg-config libsystemd-dev libutf8proc-dev libreadline-dev)
 run_packages=(dbus-daemon systemd-journal-remote)
 # Of the compilers and checkers, those of the release: clang is 14 on Debian 12, 19 on Debian 13.
 check_packages=(libgtest-dev clang clang-format clang-tidy git libclang-rt-dev mandoc python3-dbusmock

@@ -1,207 +1,226 @@
 #include "platform/line_reader.h"
-#include "platform/terminal/line_characters.h"
 #include "platform/terminal/plain_line.h"
-#include "platform/terminal/terminal_watch.h"
+#include "platform/unicode/utf8.h"
 
-#include <histedit.h>
+#include <poll.h>
 #include <sys/ioctl.h>
-#include <sys/ttydefaults.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <clocale>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <cwchar>
 #include <iostream>
-#include <iterator>
+#include <memory>
+#include <sstream>
 #include <string_view>
 #include <utility>
+#include <vector>
+
+// These use what <cstdio> declares.
+#include <readline/history.h>
+#include <readline/readline.h>
 
 namespace {
 
-// What libedit's calls back need, on the thread that reads.
-HistoryW* lineHistory = nullptr;
-HistEventW historyEvent{};
-std::wstring shownPrompt;
+// readline keeps its state in variables, and calls back on the thread that reads.
 const Completer* completer = nullptr;
-int columns = 0;                      ///< Of the screen, when it was last looked at.
-int typedEarly = 0;                   ///< Bytes to come from before the terminal was set.
-std::optional<std::wstring> lastTab;  ///< The line up to the cursor when Tab last added nothing.
+Completions completions;                     ///< Of the word at the cursor.
+volatile std::sig_atomic_t interrupted = 0;  ///< By Ctrl-C, since the prompt was written.
 
-/// Takes what libedit writes, see fopencookie(3). A character may come in pieces.
+char kBreaks[] = "/ \t\n\v\f\r";  ///< Behind a slash or white space.
+
+/// Takes what readline writes, see fopencookie(3). std::cout waits where a terminal has no room.
 ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
-  static std::mbstate_t state;
-  std::wstring characters(count, L'\0');
-  const auto* rest = bytes;
-  const auto length = mbsnrtowcs(characters.data(), &rest, count, count, &state);
-  if (length == static_cast<std::size_t>(-1)) {
-    // A sequence of the terminal may hold bytes that are no UTF-8, see terminfo(5).
-    state = {};
-    std::cout.write(bytes, static_cast<std::streamsize>(count));
-  } else {
-    characters.resize(length);
-    std::cout << toText(characters);
-  }
+  std::cout.write(bytes, static_cast<std::streamsize>(count)).flush();
   return static_cast<ssize_t>(count);
 }
 
-/// Looks how wide the screen is; whether that has changed. One of unknown width counts as libedit
-/// takes it.
-bool hasNewWidth() {
-  winsize window{};
-  ioctl(STDOUT_FILENO, TIOCGWINSZ, &window);
-  return std::exchange(columns, window.ws_col < 2 ? 80 : window.ws_col) != columns;
+/// Has `completions` be what the line up to the cursor can become.
+void lookUpCompletions() {
+  completions = (*completer)({rl_line_buffer, static_cast<std::size_t>(rl_point)});
 }
 
-/// Takes the prompt and the line off the screen: a terminal wraps them anew when its width changes.
-/// See console_codes(4).
-void eraseLine(EditLine* editor) {
-  const auto* const line = el_wline(editor);
-  int cells = 0;
-  for (const auto character : shownPrompt + std::wstring(line->buffer, line->cursor)) {
-    const int width = wcwidth(character) < 0 ? 2 : wcwidth(character);
-    const int left = columns - cells % columns;
-    cells += width > left ? left + width : width;
-  }
-  for (; cells >= columns; cells -= columns) {
-    std::cout << "\x1b[A";
-  }
-  std::cout << "\r\x1b[J";
+/// Tells readline what is in front of the word to complete: white space, and in a path a slash.
+char* breaksOfWords() {
+  lookUpCompletions();
+  const auto start = static_cast<std::size_t>(rl_point) - completions.typed;
+  return kBreaks + (start > 0 && rl_line_buffer[start - 1] == '/' ? 0 : 1);
 }
 
-/// Waits for the next byte that is typed; the result is that of read(2).
-ssize_t readByte(EditLine* editor, char& byte) {
-  while (true) {
-    std::cout.flush();
-    bool wasStopped = false;
-    const bool isReadable = waitForTerminal(wasStopped);
-    if (hasNewWidth() || wasStopped) {
-      if (!wasStopped) {
-        eraseLine(editor);
-      }
-      std::cout << '\r';
-      el_wset(editor, EL_PREP_TERM, 0);
-      el_wset(editor, EL_PREP_TERM, 1);
-      el_resize(editor);
-      el_wset(editor, EL_REFRESH);
-    } else if (isReadable) {
-      const auto count = read(STDIN_FILENO, &byte, 1);
-      // Ctrl-D that was typed early has become null, which is else what Ctrl-Space types.
-      byte = typedEarly > 0 && typedEarly-- > 0 && byte == '\0' ? char{CEOF} : byte;
-      return count;
-    }
-  }
-}
-
-/// Gives libedit the next character that is typed: 1, 0 at the end of input, -1 after an error.
-int readCharacter(EditLine* editor, wchar_t* character) {
-  const auto* const line = el_wline(editor);
-  std::mbstate_t state{};
-  for (*character = 0; *character == 0;) {
-    char byte = 0;
-    if (const auto count = readByte(editor, byte); count <= 0) {
-      return static_cast<int>(count);
-    }
-    wchar_t typed = 0;  // Also while a character is not complete.
-    if (std::mbrtowc(&typed, &byte, 1, &state) == static_cast<std::size_t>(-1)) {
-      // What came before was cut short, or this is nothing.
-      state = {};
-      std::mbrtowc(&typed, &byte, 1, &state);
-    }
-    if (typed == CEOF && line->lastchar == line->buffer) {
-      return 0;
-    }
-    *character = joinMark(line->cursor == line->buffer ? L'\0' : line->cursor[-1], typed);
-    if (*character != 0 && *character != typed) {
-      // libedit shall not find on the screen what it has not drawn.
-      eraseLine(editor);
-      el_deletestr(editor, 1);
-      el_wset(editor, EL_REFRESH);
-    }
-  }
-  return 1;
-}
-
-unsigned char completeWord(EditLine* editor, int /*key*/) {
-  const auto* const line = el_wline(editor);
-  const std::wstring before(line->buffer, line->cursor);
-  auto [typed, words] = (*completer)(toText(before));
-  std::erase_if(words, [](const auto& word) { return !toCharacters(word); });
-  auto common = words.empty() ? "" : words.front();
-  const auto& last = words.empty() ? common : words.back();
-  common.erase(std::ranges::mismatch(common, last).in1, common.end());
-  common.erase(0, typed);
-  while (!toCharacters(common)) {
-    common.pop_back();
-  }
-  if (!common.empty()) {
-    el_winsertstr(editor, toCharacters(common)->c_str());
-    return CC_REFRESH;
-  }
-  if (words.empty() || std::exchange(lastTab, before) != before) {
-    return CC_ERROR;
-  }
-  std::cout << "\x1b[J\n";
-  std::copy(words.begin(), words.end(), std::ostream_iterator<std::string>(std::cout, " "));
-  std::cout << '\n';
-  el_wset(editor, EL_REFRESH);
-  return CC_NORM;
-}
-
-/// Makes the editor, which lives as long as the process; null where lines are not to be edited.
-EditLine* makeEditor() {
-  const char* const terminal = std::getenv("TERM");
-  if (terminal == nullptr || *terminal == '\0' || terminal == std::string_view("dumb") ||
-      isatty(STDOUT_FILENO) == 0 || !watchTerminal()) {
+/// Gives readline the words one by one, the first when it is asked for the first time.
+char* nextWord(const char* /*typed*/, int isLater) {
+  static std::size_t index;
+  index = isLater == 0 ? 0 : index + 1;
+  if (index >= completions.words.size()) {
     return nullptr;
   }
-  uselocale(newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr));  // Of this thread alone.
-  auto* const screen = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
-  auto* const editor = el_init_fd("", stdin, screen, fopencookie(nullptr, "w", {}), STDIN_FILENO,
-                                  STDOUT_FILENO, STDERR_FILENO);
-  lineHistory = history_winit();
-  history_w(lineHistory, &historyEvent, H_SETSIZE, 1000);
-  el_wset(editor, EL_HIST, history_w, lineHistory);
-  el_wset(
-      editor, EL_PROMPT, +[](EditLine*) { return shownPrompt.data(); });
-  el_wset(editor, EL_GETCFN, readCharacter);
-  // libedit loses what a terminal that inserts and deletes characters moves across a row's end.
-  for (const auto* capability : {"ic", "IC", "im", "dc", "DC", "dm"}) {
-    el_set(editor, EL_SETTC, capability, "", nullptr);
+  const auto& word = completions.words[index];
+  rl_completion_append_character = word.back();
+  return strndup(word.c_str(), word.size() - 1);
+}
+
+/// Whether Tab parts words: behind one that it does not complete, with more to come. A terminal
+/// that does not mark what is pasted gives it so.
+bool isPastedTab() {
+  int waiting = 0;
+  ioctl(STDIN_FILENO, FIONREAD, &waiting);
+  lookUpCompletions();
+  const auto& [typed, words] = completions;
+  return waiting > 0 && typed > 0 && (words.empty() || words.front()[typed] != words.back()[typed]);
+}
+
+/// Has what was done to the line so far not be undone once a command has looked through the
+/// history: readline 8.2 may free these steps in two places. They are kept, as one of them may own
+/// them.
+void forgetSteps() {
+  static rl_command_func_t* const commands[] = {rl_get_previous_history,
+                                                rl_get_next_history,
+                                                rl_beginning_of_history,
+                                                rl_end_of_history,
+                                                rl_fetch_history,
+                                                rl_operate_and_get_next,
+                                                rl_reverse_search_history,
+                                                rl_forward_search_history,
+                                                rl_noninc_reverse_search,
+                                                rl_noninc_forward_search,
+                                                rl_noninc_reverse_search_again,
+                                                rl_noninc_forward_search_again,
+                                                rl_history_search_backward,
+                                                rl_history_search_forward,
+                                                rl_history_substr_search_backward,
+                                                rl_history_substr_search_forward,
+                                                rl_vi_search,
+                                                rl_vi_search_again,
+                                                rl_vi_fetch_history};
+  static std::vector<UNDO_LIST*> steps;
+  if (rl_undo_list != nullptr && std::ranges::find(commands, rl_last_func) != std::end(commands)) {
+    steps.push_back(std::exchange(rl_undo_list, nullptr));
   }
-  el_set(editor, EL_EDITOR, "emacs");
-  el_set(editor, EL_ADDFN, "complete", "", completeWord);
-  el_set(editor, EL_BIND, "^I", "complete", nullptr);
-  // Between lines, what is typed is not shown and waits for the editor as it is.
-  el_set(editor, EL_SETTY, "-x", "-icanon", "-echo", nullptr);
-  ioctl(STDIN_FILENO, FIONREAD, &typedEarly);
-  return editor;
+}
+
+/// The next byte that is typed. Below 0 after Ctrl-C, and when none will come.
+int readByte() {
+  if (RL_ISSTATE(RL_STATE_READCMD)) {
+    forgetSteps();
+  }
+  pollfd terminal{STDIN_FILENO, POLLIN, 0};
+  do {
+    const bool wasStopped = rl_pending_signal() == SIGTSTP;
+    rl_check_signals();
+    if (wasStopped) {
+      rl_forced_update_display();
+    }
+  } while (interrupted == 0 && poll(&terminal, 1, -1) < 0);
+  if (interrupted != 0) {
+    return RL_ISSTATE(RL_STATE_READCMD) ? READERR : EOF;
+  }
+  const int byte = rl_getc(stdin);
+  return byte == '\t' && isPastedTab() ? ' ' : byte;
+}
+
+/// Gives readline byte by byte what is typed, and U+FFFD for what is no UTF-8: readline loses the
+/// byte by which it finds that out.
+int readUtf8(FILE* /*stream*/) {
+  static std::string typed;
+  static std::string text;
+  while (text.empty()) {
+    const int byte = readByte();
+    if (byte < 0) {
+      typed.clear();
+      return byte;
+    }
+    typed += static_cast<char>(byte);
+    text = takeUtf8(typed);
+  }
+  const auto byte = static_cast<unsigned char>(text.front());
+  text.erase(0, 1);
+  return byte;
+}
+
+/// Takes the byte behind the beginning of a key's sequence.
+int skipByte(int /*count*/, int /*key*/) {
+  return rl_read_key() < 0 ? 1 : 0;
+}
+
+/// Sets readline up, once; false where lines are not to be edited.
+bool prepareEditing() {
+  const char* const terminal = std::getenv("TERM");
+  if (terminal == nullptr || *terminal == '\0' || terminal == std::string_view("dumb") ||
+      isatty(STDIN_FILENO) == 0 || isatty(STDOUT_FILENO) == 0) {
+    return false;
+  }
+  uselocale(newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr));  // Of this thread alone.
+  rl_readline_name = "velltool";
+  rl_outstream = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
+  rl_getc_function = readUtf8;
+  rl_change_environment = 0;
+  rl_completion_word_break_hook = breaksOfWords;
+  rl_completion_entry_function = nextWord;
+  // Sequences of keys that mean nothing. What is bound later goes first.
+  rl_bind_keyseq("\\e[", rl_skip_csi_sequence);
+  rl_bind_keyseq("\\e[[", skipByte);
+  rl_bind_keyseq("\\eO", skipByte);
+  rl_initialize();
+  // readline has asked the environment whether there are other bytes than ASCII. The person's own
+  // settings, which may say something else, go last.
+  rl_variable_bind("input-meta", "on");
+  rl_variable_bind("output-meta", "on");
+  rl_variable_bind("convert-meta", "off");
+  rl_re_read_init_file(0, 0);
+  stifle_history(1000);
+  return std::at_quick_exit(rl_deprep_terminal) == 0;
+}
+
+/// Lets readline edit a line; Ctrl-C gives up the line, and begins another.
+std::unique_ptr<char, void (*)(void*)> editLine(const std::string& prompt) {
+  std::unique_ptr<char, void (*)(void*)> line(nullptr, std::free);
+  auto* const found = std::signal(SIGINT, [](int) { interrupted = 1; });
+  if (found == SIG_IGN) {
+    std::signal(SIGINT, SIG_IGN);
+  }
+  do {
+    interrupted = 0;
+    rl_eof_found = 0;
+    line.reset(readline(prompt.c_str()));
+    if (!line && rl_variable_value("enable-bracketed-paste") != std::string_view("on")) {
+      std::cout << std::endl;  // As readline itself does where it has turned that off.
+    }
+  } while (interrupted != 0);
+  std::signal(SIGINT, found);
+  return line;
+}
+
+/// Adds a line to the history, unless it was the last one, too.
+void remember(const std::string& line) {
+  if (!line.empty() && (history_length == 0 || history_list()[history_length - 1]->line != line)) {
+    add_history(line.c_str());
+  }
 }
 
 }  // namespace
 
-std::optional<std::string> readLine(const std::string& promptText, const Completer& complete) {
-  static auto* const editor = makeEditor();
-  const auto characters = toCharacters(promptText);
-  if (editor == nullptr || !characters) {
-    restoreTerminal();
-    return readPlainLine(promptText);
+std::optional<std::string> readLine(const std::string& prompt, const Completer& complete) {
+  static const bool isEditing = prepareEditing();
+  if (!isEditing) {
+    return readPlainLine(prompt);
   }
-  shownPrompt = *characters;
-  completer = &complete;
-  lastTab.reset();
-  const bool ended = el_wgets(editor, nullptr) == nullptr;
-  const auto* const edited = el_wline(editor);
-  std::wstring line(edited->buffer, edited->lastchar);
-  // The end of input may break off a line. One that is whole is an earlier one.
-  if (!std::cout.flush() || (ended && (line.empty() || line.back() == L'\n'))) {
-    return std::nullopt;
+  static std::istringstream pasted;  // Lines that were entered together with an earlier one.
+  std::string line;
+  if (std::getline(pasted, line)) {
+    std::cout << prompt << line << std::endl;
+  } else {
+    completer = &complete;
+    const auto entered = editLine(prompt);
+    if (!entered) {
+      return std::nullopt;
+    }
+    remember(entered.get());
+    pasted = std::istringstream(entered.get());
+    std::getline(pasted, line);
   }
-  line.erase(line.find_last_not_of(L'\n') + 1);
-  if (!line.empty()) {
-    history_w(lineHistory, &historyEvent, H_ENTER, line.c_str());
-  }
-  return toText(line);
+  return std::cout ? std::optional(line) : std::nullopt;
 }

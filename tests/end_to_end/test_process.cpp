@@ -114,6 +114,11 @@ bool TestProcess::readSome(const std::string& awaited) {
   return count > 0;
 }
 
+bool TestProcess::hasMore(std::chrono::milliseconds patience) const {
+  pollfd readable{output.get(), POLLIN, 0};
+  return !unreadOutput.empty() || poll(&readable, 1, static_cast<int>(patience.count())) > 0;
+}
+
 void TestProcess::giveUp(const std::string& awaited) const {
   throw std::runtime_error("no \"" + awaited + "\"; unread output \"" + unreadOutput +
                            "\", errors \"" + writtenErrors() + "\"");

@@ -4,6 +4,7 @@
 
 #include <sys/types.h>
 
+#include <chrono>
 #include <filesystem>
 #include <memory>
 #include <ostream>
@@ -47,6 +48,9 @@ class TestProcess {
   /// Waits for more standard output and keeps it for the calls that take it. False at the end. A
   /// wait that is given up names what was `awaited`.
   bool readSome(const std::string& awaited = "more output");
+
+  /// Whether standard output has more, now or within `patience`; true at its end, too.
+  [[nodiscard]] bool hasMore(std::chrono::milliseconds patience) const;
 
   /// Whether each write to standard output so far ended with its first line break, if it had any.
   [[nodiscard]] bool wroteEachLineAtOnce() const { return eachLineAtOnce; }
