@@ -1,4 +1,5 @@
-// The two operations of a work group that may fail: the tests make them fail.
+// The two operations of a work group that may fail. In a file of their own because the unit tests
+// leave it out and have them fail at will.
 
 #include "platform/portable/work_group_state.h"
 
