@@ -28,16 +28,11 @@ MessageDict presentTime(const std::string& key) {
   std::ostringstream text;
   text << std::put_time(&parts, "%Y-%m-%d-%H-%M-%S-") << std::setw(3) << std::setfill('0')
        << now.time_since_epoch() / std::chrono::milliseconds(1) % 1000;
-  MessageDict payload;
-  payload.set(key, text.str());
-  return payload;
+  return MessageDict::fromEntries({{key, text.str()}});
 }
 
 Answer refuse(const std::string& what) {
-  Answer answer;
-  answer.status = kStatusBadRequest;
-  answer.message = "unknown " + what;
-  return answer;
+  return {.status = kStatusBadRequest, .message = "unknown " + what};
 }
 
 /// `answer` with what goes wrong by the plan for `detail` of `fault`, or else by that for `fault`.
@@ -78,9 +73,10 @@ std::string archiveName(const std::string& name, const MessageDict& request) {
     const MessageDict::Entry entry = {vell::kKeyTraceDumpStatePerformCompression, mode};
     return std::count(request.entries().begin(), request.entries().end(), entry) > 0;
   };
-  return asksFor(kCompressionTarGz) ? name + ".tar.gz"
-         : asksFor(kCompressionTar) ? name + ".tar"
-                                    : "";
+  if (asksFor(kCompressionTarGz)) {
+    return name + ".tar.gz";
+  }
+  return asksFor(kCompressionTar) ? name + ".tar" : "";
 }
 
 Answer traceProperty(const Profile& profile, const MessageDict& request) {

@@ -20,11 +20,12 @@ struct Collection {
 /// All that the other side does about one request, in the order of the members.
 struct Answer {
   std::chrono::milliseconds delay{0};
-  std::optional<Collection> collection;  ///< Complete on disk before the reply is sent.
-  Conduct conduct = Conduct::Reply;      ///< What follows counts for `Conduct::Reply` only.
+  std::optional<Collection> collection =
+      std::nullopt;                  ///< Complete on disk before the reply is sent.
+  Conduct conduct = Conduct::Reply;  ///< What follows counts for `Conduct::Reply` only.
   std::int32_t status = 0;
   std::string message;
-  MessageDict reply;  ///< May be `notADictionary`, may hold values of other types.
+  MessageDict reply = MessageDict();  ///< May be `notADictionary`, may hold values of other types.
 };
 
 /// What the manager of the device that `profile` describes answers to a command. Does not depend on

@@ -37,13 +37,11 @@ void adopt(const ChildManners& manners, pid_t parent, int pipe) {
   if (manners.isService) {
     setpgid(0, 0);
   }
-  const std::pair<int, int> streams[] = {{manners.input, STDIN_FILENO},
-                                         {manners.output, STDOUT_FILENO},
-                                         {manners.piped < 0 ? -1 : pipe, manners.piped}};
-  for (const auto& [file, stream] : streams) {
-    if (file >= 0) {
-      dup2(file, stream);
-    }
+  if (manners.input >= 0) {
+    dup2(manners.input, STDIN_FILENO);
+  }
+  if (manners.piped >= 0) {
+    dup2(pipe, manners.piped);
   }
   sigset_t none;
   sigemptyset(&none);

@@ -15,7 +15,6 @@ struct ChildManners {
   int signalAtParentsDeath = SIGKILL;  ///< Sent to the child when this process ends.
   bool isService = true;               ///< The child gets no signals from the terminal.
   int input = -1;                      ///< Its standard input.
-  int output = -1;                     ///< Its standard output.
   int piped = -1;  ///< STDIN_FILENO or STDOUT_FILENO, to have that be a pipe to this process.
 };
 

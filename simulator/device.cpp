@@ -63,7 +63,8 @@ void signalFamily(pid_t process, int signalNumber) {
   }
 }
 
-/// The processes of one device. Everything still running is killed with the object.
+/// The processes of one device. Everything still running is killed with the object. Throws
+/// std::system_error where /proc does not tell what this program is.
 class Device {
  public:
   /// Sets the environment for the device at `deviceRoot`, which must outlive this.
@@ -132,12 +133,7 @@ class Device {
 
  private:
   bool startService(const std::string& name) {
-    std::error_code error;
-    const auto self = std::filesystem::read_symlink("/proc/self/exe", error).string();
-    if (error) {
-      complain("/proc/self/exe: " + error.message());
-      return false;
-    }
+    const auto self = std::filesystem::read_symlink("/proc/self/exe").string();
     const auto log = root.path() / kLogDirectory / (name + ".log");
     const auto child = startChild(
         {self, "--serve", name, log.string()},
@@ -186,12 +182,14 @@ int runOnDevice(const Profile& profile, const std::vector<std::string>& command)
   // Blocked before anything is started or written, so that all of it is cleaned up.
   const auto signals = deviceSignals();
   sigprocmask(SIG_BLOCK, &signals, nullptr);
-  const auto root = DeviceRoot::create(profile);
-  if (!root) {
+  try {
+    const DeviceRoot root(profile);
+    Device device(root);
+    return device.start(profile) ? device.run(command) : EXIT_FAILURE;
+  } catch (const std::system_error& error) {
+    complain(std::string("cannot make a device: ") + error.what());
     return EXIT_FAILURE;
   }
-  Device device(*root);
-  return device.start(profile) ? device.run(command) : EXIT_FAILURE;
 }
 
 }  // namespace simulator

@@ -6,12 +6,13 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <cctype>
 #include <cerrno>
 #include <cstdlib>
+#include <cstring>
 #include <fstream>
 #include <iomanip>
 #include <sstream>
-#include <string_view>
 #include <system_error>
 #include <vector>
 
@@ -26,6 +27,15 @@ constexpr const char* kSnapshotDirectory = "private/var/wireless/Library/Logs/Fa
 constexpr const char* kDiagDirectory = "private/var/wireless/Library/Logs/VellManager/DIAG.scratch";
 constexpr const char* kQdssDirectory = "private/var/wireless/Library/Logs/VellManager/QDSS.scratch";
 
+/// Makes an empty directory and returns its path. Throws std::system_error.
+fs::path makeDirectory() {
+  auto pattern = (fs::temp_directory_path() / "vell-simulator-XXXXXX").string();
+  if (mkdtemp(pattern.data()) == nullptr) {
+    throw std::system_error(errno, std::generic_category(), pattern);
+  }
+  return fs::canonical(pattern);
+}
+
 /// Throws std::system_error.
 void writeFile(const fs::path& path, const std::string& text) {
   fs::create_directories(path.parent_path());
@@ -39,19 +49,17 @@ void writeFile(const fs::path& path, const std::string& text) {
 /// As a value of a bus address: what has a meaning there is written in hexadecimal. That leaves
 /// nothing that has one in XML.
 std::string escapeForAddress(const std::string& text) {
-  constexpr std::string_view kPlain =
-      "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789-_/.*";
-  constexpr std::string_view kDigits = "0123456789abcdef";
-  std::string escaped;
+  std::ostringstream escaped;
+  escaped << std::hex << std::setfill('0');
   for (const char character : text) {
-    if (kPlain.find(character) != std::string_view::npos) {
-      escaped += character;
-      continue;
-    }
     const auto byte = static_cast<unsigned char>(character);
-    escaped += {'%', kDigits[byte / kDigits.size()], kDigits[byte % kDigits.size()]};
+    if (byte < 0x80 && (std::isalnum(byte) != 0 || std::strchr("-_/.*", byte) != nullptr)) {
+      escaped << byte;
+    } else {
+      escaped << '%' << std::setw(2) << unsigned{byte};
+    }
   }
-  return escaped;
+  return escaped.str();
 }
 
 /// A bus on which everybody may do everything: it is the device's owner who runs it.
@@ -84,17 +92,15 @@ std::string savedTraces(const Profile& profile) {
 /// Writes the process table; see proc(5).
 void writeProcesses(const fs::path& table, const std::vector<std::string>& names) {
   constexpr std::size_t kLongestCommandName = 15;
-  constexpr int kFirstProcess = 100;
   fs::create_directories(table);
-  int process = kFirstProcess;
-  for (const auto& name : names) {
+  for (int process = 100; const auto& name : names) {
     const auto entry = table / std::to_string(process++);
     writeFile(entry / "comm", name.substr(0, kLongestCommandName) + "\n");
     fs::create_symlink("/usr/libexec/" + name, entry / "exe");
   }
 }
 
-/// Packs the directories of a collection, which lie in `folder`, into `archive`.
+/// Packs the directories of a collection, which lie in `folder`, into `archive`. Removes `folder`.
 bool pack(const fs::path& folder, const std::vector<std::string>& directories,
           const fs::path& archive) {
   std::vector<std::string> words = {"tar",
@@ -105,43 +111,14 @@ bool pack(const fs::path& folder, const std::vector<std::string>& directories,
                                     "--directory=" + folder.string()};
   words.insert(words.end(), directories.begin(), directories.end());
   const pid_t tar = startChild(words, {}).process;
-  return tar > 0 && awaitChild(tar) == 0;
+  const bool packed = tar > 0 && awaitChild(tar) == 0;
+  fs::remove_all(folder);
+  return packed;
 }
 
 }  // namespace
 
-std::unique_ptr<DeviceRoot> DeviceRoot::create(const Profile& profile) {
-  try {
-    auto pattern = (fs::temp_directory_path() / "vell-simulator-XXXXXX").string();
-    if (mkdtemp(pattern.data()) == nullptr) {
-      throw std::system_error(errno, std::generic_category(), pattern);
-    }
-    std::unique_ptr<DeviceRoot> root(new DeviceRoot(fs::canonical(pattern)));
-    root->fill(profile);
-    return root;
-  } catch (const std::system_error& error) {
-    complain(std::string("cannot make a device: ") + error.what());
-    return nullptr;
-  }
-}
-
-DeviceRoot::~DeviceRoot() {
-  // What the device's processes have started ends a little after them, and may still make files.
-  constexpr int kMostAttempts = 100;
-  std::error_code error;
-  for (int attempt = 0; attempt < kMostAttempts && fs::exists(root); ++attempt) {
-    fs::remove_all(root, error);
-  }
-  if (fs::exists(root)) {
-    complain("cannot remove " + root.string() + ": " + error.message());
-  }
-}
-
-std::string DeviceRoot::busAddress() const {
-  return "unix:path=" + escapeForAddress((root / kBusSocket).string());
-}
-
-void DeviceRoot::fill(const Profile& profile) {
+DeviceRoot::DeviceRoot(const Profile& profile) : DeviceRoot(makeDirectory()) {
   for (const auto* const directory :
        {kLogDirectory, kSnapshotDirectory, kDiagDirectory, kQdssDirectory}) {
     fs::create_directories(root / directory);
@@ -161,6 +138,22 @@ void DeviceRoot::fill(const Profile& profile) {
   }
 }
 
+DeviceRoot::~DeviceRoot() {
+  // What the device's processes have started ends a little after them, and may still make files.
+  constexpr int kMostAttempts = 100;
+  std::error_code error;
+  for (int attempt = 0; attempt < kMostAttempts && fs::exists(root); ++attempt) {
+    fs::remove_all(root, error);
+  }
+  if (fs::exists(root)) {
+    complain("cannot remove " + root.string() + ": " + error.message());
+  }
+}
+
+std::string DeviceRoot::busAddress() const {
+  return "unix:path=" + escapeForAddress((root / kBusSocket).string());
+}
+
 bool writeCollection(const fs::path& root, const Collection& collection,
                      const std::string& contents) {
   const auto& [directories, archive] = collection;
@@ -170,11 +163,7 @@ bool writeCollection(const fs::path& root, const Collection& collection,
     for (const auto& directory : directories) {
       writeFile(folder / directory / "request.txt", contents + "\n");
     }
-    const bool packed = archive.empty() || pack(folder, directories, snapshots / archive);
-    if (!archive.empty()) {
-      fs::remove_all(folder);
-    }
-    return packed;
+    return archive.empty() || pack(folder, directories, snapshots / archive);
   } catch (const std::system_error& error) {
     complain(std::string("cannot write a collection: ") + error.what());
     return false;

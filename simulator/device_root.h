@@ -5,7 +5,6 @@
 #include "simulator/profile.h"
 
 #include <filesystem>
-#include <memory>
 #include <string>
 #include <utility>
 
@@ -20,10 +19,9 @@ inline constexpr const char* kBusSocket = "run/bus";
 /// The file system of one simulated device, in a directory of its own; gone with this object.
 class DeviceRoot {
  public:
-  /// Makes the file system of the device that `profile` describes. Complains and gives nothing when
-  /// that is not possible.
-  static std::unique_ptr<DeviceRoot> create(const Profile& profile);
-
+  /// Makes the file system of the device that `profile` describes. Throws std::system_error, and
+  /// leaves nothing behind, when that is not possible.
+  explicit DeviceRoot(const Profile& profile);
   DeviceRoot(const DeviceRoot&) = delete;
   DeviceRoot& operator=(const DeviceRoot&) = delete;
   ~DeviceRoot();
@@ -39,8 +37,6 @@ class DeviceRoot {
 
  private:
   explicit DeviceRoot(std::filesystem::path directory) : root(std::move(directory)) {}
-
-  void fill(const Profile& profile);
 
   std::filesystem::path root;
   FileDescriptor control;  ///< Open at both ends, so that the manager never sees the end of it.

@@ -83,8 +83,7 @@ std::string lastHour(JournalTime now) {
 
 /// Starts a process that stores, in `file`, what is written to its pipe in the export format.
 Child startStoring(const std::filesystem::path& file) {
-  return startChild({VELL_JOURNAL_REMOTE, "-o", file.string(), "-"},
-                    {.output = STDERR_FILENO, .piped = STDIN_FILENO});
+  return startChild({VELL_JOURNAL_REMOTE, "-o", file.string(), "-"}, {.piped = STDIN_FILENO});
 }
 
 /// Stores `text` and waits until it is there.

@@ -59,10 +59,8 @@ std::optional<std::string_view> takeSizedValue(std::string_view& rest) {
 }
 
 bool isFieldName(std::string_view name) {
-  return !name.empty() && std::all_of(name.begin(), name.end(), [](char character) {
-    return (character >= 'A' && character <= 'Z') || (character >= '0' && character <= '9') ||
-           character == '_';
-  });
+  return !name.empty() &&
+         name.find_first_not_of("ABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789_") == std::string_view::npos;
 }
 
 /// The fields of a datagram that a program can set itself; none when it is malformed.

@@ -32,7 +32,7 @@ using Words = std::vector<std::string>;
 
 constexpr int kUsageError = 2;
 
-int refuse(const std::string& what) {
+int refuseWords(const std::string& what) {
   complain(what +
            "; usage: vell-simulator [PROFILE] [-- COMMAND...] | "
            "--serve bus|manager|helper|journal [LOGFILE]");
@@ -82,12 +82,12 @@ int serve(const Words& words) {
       {"journal", [] { return serveJournal(sysroot()); }},
   };
   if (words.empty() || words.size() > 2) {
-    return refuse("--serve takes a service and perhaps a file");
+    return refuseWords("--serve takes a service and perhaps a file");
   }
   const auto& name = words.front();
   const auto service = services.find(name);
   if (service == services.end()) {
-    return refuse("no service is called \"" + name + "\"");
+    return refuseWords("no service is called \"" + name + "\"");
   }
   if (isLocalMachine()) {
     complain("--serve works inside a simulated device only");
@@ -109,15 +109,15 @@ int run(const Words& words) {
   }
   const auto separator = std::find(words.begin(), words.end(), "--");
   if (separator - words.begin() > 1) {
-    return refuse("more than one profile");
+    return refuseWords("more than one profile");
   }
   const bool hasProfile = separator != words.begin();
   if (hasProfile && (words.front().empty() || words.front().front() == '-')) {
-    return refuse("\"" + words.front() + "\" is no profile");
+    return refuseWords("\"" + words.front() + "\" is no profile");
   }
   const bool hasCommand = separator != words.end();
   if (hasCommand && std::next(separator) == words.end()) {
-    return refuse("no command after --");
+    return refuseWords("no command after --");
   }
   const auto profile = readProfile(hasProfile ? words.front() : "");
   if (!profile) {

@@ -48,11 +48,6 @@ bool isFault(const std::string& key) {
   return base == kFaultGetTraceProperty || base == kFaultTraceDumpState || base == kFaultHelper;
 }
 
-/// Trace properties have a point in their keys.
-bool isTrace(const std::string& key) {
-  return key.find('.') != std::string::npos && !isFault(key);
-}
-
 /// The key whose type `key` tells, if it tells one, else `key`.
 std::string withoutType(const std::string& key) {
   constexpr std::string_view kTypeEnding = "_TYPE";
@@ -194,9 +189,7 @@ class ProfileReader {
 
   /// As `payload`, `fallback` being the text when there is none.
   MessageDict payload(const std::string& key, const std::string& name, const char* fallback) {
-    MessageDict dict;
-    dict.set(name, fallback);
-    return payload(key, name).value_or(dict);
+    return payload(key, name).value_or(MessageDict::fromEntries({{name, fallback}}));
   }
 
   /// As `payload`, of what becomes a part of file names.
@@ -208,12 +201,12 @@ class ProfileReader {
     return dict;
   }
 
-  /// All trace properties, by their names.
+  /// All trace properties, by their names: what has a point in its key and is no fault.
   std::map<std::string, MessageDict> traces() {
     std::map<std::string, MessageDict> found;
     for (const auto& [key, setting] : file.settings) {
       const auto name = withoutType(key);
-      if (isTrace(key) && !found.contains(name)) {
+      if (key.find('.') != std::string::npos && !isFault(key) && !found.contains(name)) {
         found[name] = payload(name, vell::kKeyTracePropertyValue, "");
       }
     }

@@ -1,6 +1,8 @@
 #include "simulator/request_text.h"
 
 #include <cstdint>
+#include <iomanip>
+#include <sstream>
 #include <variant>
 
 namespace simulator {
@@ -9,20 +11,17 @@ namespace {
 
 /// Control characters, quotes and backslashes as C escapes.
 std::string escaped(const std::string& text) {
-  constexpr const char* kDigits = "0123456789abcdef";
-  std::string result;
+  std::ostringstream result;
+  result << std::hex << std::setfill('0');
   for (const char character : text) {
     const auto byte = static_cast<unsigned char>(character);
     if (byte < ' ' || byte == 0x7f) {
-      result += {'\\', 'x', kDigits[byte / 16], kDigits[byte % 16]};
-      continue;
+      result << "\\x" << std::setw(2) << unsigned{byte};
+    } else {
+      result << (byte == '"' || byte == '\\' ? "\\" : "") << byte;
     }
-    if (character == '"' || character == '\\') {
-      result += '\\';
-    }
-    result += character;
   }
-  return result;
+  return result.str();
 }
 
 struct ValueDescriber {

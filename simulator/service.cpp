@@ -131,7 +131,7 @@ class Service {
     if (answer.delay.count() == 0) {
       return carryOut(call, std::move(answer), line);
     }
-    const auto delay = std::chrono::duration_cast<std::chrono::microseconds>(answer.delay);
+    const std::chrono::microseconds delay = answer.delay;
     held.push_back(
         {this, BusMessagePtr(sd_bus_message_ref(call)), std::move(answer), line, nullptr});
     sd_event_source* timer = nullptr;
@@ -212,9 +212,8 @@ class Manager : public Service {
  private:
   static int openClient(sd_bus_message* call, void* /*userdata*/, sd_bus_error* /*error*/) {
     const char* name = nullptr;
-    const int result = sd_bus_message_read(call, "s", &name);
-    if (result < 0) {
-      return result;
+    if (sd_bus_message_read(call, "s", &name) < 0) {
+      return -EBADMSG;
     }
     std::clog << "OpenClient " << quoted(name) << std::endl;
     return sd_bus_reply_method_return(call, "");
