@@ -8,7 +8,6 @@
 #include <iostream>
 #include <iterator>
 #include <limits>
-#include <optional>
 #include <set>
 #include <string>
 #include <system_error>
@@ -110,10 +109,7 @@ WordCompleter makeOsLogCompleter() {
 
 CommandHandler makeOsLogHandler() {
   return [](WorkGroup group, std::list<std::string> args) {
-    std::optional<WorkGroup::Membership> membership;
-    if (group) {
-      membership.emplace(std::move(group));
-    }
+    const WorkGroup::Membership membership(std::move(group));
     return exportOsLog(std::move(args));
   };
 }

@@ -11,7 +11,7 @@ void endIfScarce(int error);
 
 /// What a library returned, a negative errno after a failure; ends the process as `endIfScarce`
 /// does. Such a failure tells nothing of what was asked.
-inline int unlessScarce(int result) {
+inline int checked(int result) {
   endIfScarce(-result);
   return result;
 }

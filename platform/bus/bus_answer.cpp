@@ -9,8 +9,8 @@ bool readMembers(sd_bus_message* message, AnswerForm form, BusAnswer& answer) {
   const bool hasText = form == AnswerForm::statusMessageReply;
   const char* text = "";
   if (sd_bus_message_has_signature(message, hasText ? "isv" : "iv") <= 0 ||
-      unlessScarce(sd_bus_message_read(message, "i", &answer.result.status)) <= 0 ||
-      (hasText && unlessScarce(sd_bus_message_read(message, "s", &text)) <= 0)) {
+      checked(sd_bus_message_read(message, "i", &answer.result.status)) <= 0 ||
+      (hasText && checked(sd_bus_message_read(message, "s", &text)) <= 0)) {
     return false;
   }
   answer.result.message = text;

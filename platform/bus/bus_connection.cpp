@@ -103,7 +103,7 @@ bool BusConnection::runPosted() {
 void BusConnection::connect() {
   sd_bus* opened = nullptr;
   nextAttempt = Clock::now() + kRetryPause;
-  if (unlessScarce(sd_bus_open_system(&opened)) < 0) {
+  if (checked(sd_bus_open_system(&opened)) < 0) {
     return;
   }
   bus.reset(opened);
@@ -114,7 +114,7 @@ void BusConnection::connect() {
 void BusConnection::process() {
   int progress = bus ? 1 : 0;
   for (int step = 0; progress > 0 && step < kMostStepsAtOnce; ++step) {
-    progress = unlessScarce(sd_bus_process(bus.get(), nullptr));
+    progress = checked(sd_bus_process(bus.get(), nullptr));
     if (!ready && sd_bus_is_ready(bus.get()) > 0) {
       becomeReady();
     }
@@ -185,8 +185,8 @@ void BusConnection::send(const BusCall& call, ReplyHandler handler) {
 
 bool BusConnection::sendTo(sd_bus* target, const BusCall& call, Pending& pending) {
   sd_bus_message* made = nullptr;
-  if (unlessScarce(sd_bus_message_new_method_call(target, &made, call.destination, call.path,
-                                                  call.interface, call.member)) < 0) {
+  if (checked(sd_bus_message_new_method_call(target, &made, call.destination, call.path,
+                                             call.interface, call.member)) < 0) {
     return false;
   }
   const BusMessagePtr message(made);
@@ -194,7 +194,7 @@ bool BusConnection::sendTo(sd_bus* target, const BusCall& call, Pending& pending
     return false;
   }
   sd_bus_slot* slot = nullptr;
-  if (unlessScarce(sd_bus_call_async(target, &slot, made, onReply, &pending, kNoTimeLimit)) < 0) {
+  if (checked(sd_bus_call_async(target, &slot, made, onReply, &pending, kNoTimeLimit)) < 0) {
     return false;
   }
   pending.slot.reset(slot);

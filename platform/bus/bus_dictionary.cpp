@@ -12,7 +12,7 @@
 namespace {
 
 bool openVariant(sd_bus_message* message, const char* contents) {
-  return unlessScarce(sd_bus_message_open_container(message, SD_BUS_TYPE_VARIANT, contents)) >= 0;
+  return checked(sd_bus_message_open_container(message, SD_BUS_TYPE_VARIANT, contents)) >= 0;
 }
 
 bool closeContainer(sd_bus_message* message) {
@@ -27,18 +27,18 @@ struct ValueAppender {
     return openVariant(message, "s") && appendText(message, text) && closeContainer(message);
   }
   bool operator()(std::int64_t number) const {
-    return unlessScarce(sd_bus_message_append(message, "v", "x", number)) >= 0;
+    return checked(sd_bus_message_append(message, "v", "x", number)) >= 0;
   }
   bool operator()(bool flag) const {
-    return unlessScarce(sd_bus_message_append(message, "v", "b", static_cast<int>(flag))) >= 0;
+    return checked(sd_bus_message_append(message, "v", "b", static_cast<int>(flag))) >= 0;
   }
   bool operator()(MessageDict::OtherType /*other*/) const {
-    return unlessScarce(sd_bus_message_append(message, "v", "d", 0.0)) >= 0;
+    return checked(sd_bus_message_append(message, "v", "d", 0.0)) >= 0;
   }
 };
 
 bool appendEntry(sd_bus_message* message, const MessageDict::Entry& entry) {
-  return unlessScarce(sd_bus_message_open_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv")) >= 0 &&
+  return checked(sd_bus_message_open_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv")) >= 0 &&
          appendText(message, entry.key) && std::visit(ValueAppender{message}, entry.value) &&
          closeContainer(message);
 }
@@ -47,7 +47,7 @@ bool appendEntry(sd_bus_message* message, const MessageDict::Entry& entry) {
 std::string_view variantContents(sd_bus_message* message) {
   char type = 0;
   const char* contents = nullptr;
-  if (unlessScarce(sd_bus_message_peek_type(message, &type, &contents)) <= 0 ||
+  if (checked(sd_bus_message_peek_type(message, &type, &contents)) <= 0 ||
       type != SD_BUS_TYPE_VARIANT) {
     return {};
   }
@@ -57,14 +57,14 @@ std::string_view variantContents(sd_bus_message* message) {
 /// Reads one entry. `end`: there was none left.
 bool readEntry(sd_bus_message* message, std::vector<MessageDict::Entry>& entries, bool& end) {
   const int entered =
-      unlessScarce(sd_bus_message_enter_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv"));
+      checked(sd_bus_message_enter_container(message, SD_BUS_TYPE_DICT_ENTRY, "sv"));
   end = entered == 0;
   if (entered <= 0) {
     return entered == 0;
   }
   const char* key = nullptr;
   MessageDict::Value value;
-  if (unlessScarce(sd_bus_message_read(message, "s", &key)) <= 0 || !readValue(message, value)) {
+  if (checked(sd_bus_message_read(message, "s", &key)) <= 0 || !readValue(message, value)) {
     return false;
   }
   entries.push_back({key, std::move(value)});
@@ -76,11 +76,11 @@ bool readEntry(sd_bus_message* message, std::vector<MessageDict::Entry>& entries
 bool appendText(sd_bus_message* message, const std::string& text) {
   // The library takes no noncharacters either, although the bus itself would.
   const auto taken = interchangeText(text);
-  return unlessScarce(sd_bus_message_append_basic(message, SD_BUS_TYPE_STRING, taken.c_str())) >= 0;
+  return checked(sd_bus_message_append_basic(message, SD_BUS_TYPE_STRING, taken.c_str())) >= 0;
 }
 
 bool appendDictionary(sd_bus_message* message, const MessageDict& dict) {
-  return unlessScarce(sd_bus_message_open_container(message, SD_BUS_TYPE_ARRAY, "{sv}")) >= 0 &&
+  return checked(sd_bus_message_open_container(message, SD_BUS_TYPE_ARRAY, "{sv}")) >= 0 &&
          std::all_of(dict.entries().begin(), dict.entries().end(),
                      [&](const auto& entry) { return appendEntry(message, entry); }) &&
          closeContainer(message);
@@ -88,7 +88,7 @@ bool appendDictionary(sd_bus_message* message, const MessageDict& dict) {
 
 bool appendPayload(sd_bus_message* message, const MessageDict& dict) {
   if (!dict.isDictionary()) {
-    return unlessScarce(sd_bus_message_append(message, "v", "s", "no dictionary")) >= 0;
+    return checked(sd_bus_message_append(message, "v", "s", "no dictionary")) >= 0;
   }
   return openVariant(message, "a{sv}") && appendDictionary(message, dict) &&
          closeContainer(message);
@@ -98,29 +98,29 @@ bool readValue(sd_bus_message* message, MessageDict::Value& value) {
   const auto contents = variantContents(message);
   if (contents == "s") {
     const char* text = nullptr;
-    const bool read = unlessScarce(sd_bus_message_read(message, "v", "s", &text)) > 0;
+    const bool read = checked(sd_bus_message_read(message, "v", "s", &text)) > 0;
     value = std::string(read ? text : "");
     return read;
   }
   if (contents == "x") {
     std::int64_t number = 0;
-    const bool read = unlessScarce(sd_bus_message_read(message, "v", "x", &number)) > 0;
+    const bool read = checked(sd_bus_message_read(message, "v", "x", &number)) > 0;
     value = number;
     return read;
   }
   if (contents == "b") {
     int flag = 0;
-    const bool read = unlessScarce(sd_bus_message_read(message, "v", "b", &flag)) > 0;
+    const bool read = checked(sd_bus_message_read(message, "v", "b", &flag)) > 0;
     value = flag != 0;
     return read;
   }
   value = MessageDict::OtherType{};
-  return unlessScarce(sd_bus_message_skip(message, "v")) > 0;
+  return checked(sd_bus_message_skip(message, "v")) > 0;
 }
 
 bool readDictionary(sd_bus_message* message, MessageDict& dict) {
   dict = MessageDict();
-  if (unlessScarce(sd_bus_message_enter_container(message, SD_BUS_TYPE_ARRAY, "{sv}")) <= 0) {
+  if (checked(sd_bus_message_enter_container(message, SD_BUS_TYPE_ARRAY, "{sv}")) <= 0) {
     return false;
   }
   std::vector<MessageDict::Entry> entries;
@@ -136,8 +136,8 @@ bool readDictionary(sd_bus_message* message, MessageDict& dict) {
 bool readPayload(sd_bus_message* message, MessageDict& dict) {
   dict = MessageDict::notADictionary();
   if (variantContents(message) != "a{sv}") {
-    return unlessScarce(sd_bus_message_skip(message, "v")) > 0;
+    return checked(sd_bus_message_skip(message, "v")) > 0;
   }
-  return unlessScarce(sd_bus_message_enter_container(message, SD_BUS_TYPE_VARIANT, "a{sv}")) > 0 &&
+  return checked(sd_bus_message_enter_container(message, SD_BUS_TYPE_VARIANT, "a{sv}")) > 0 &&
          readDictionary(message, dict) && sd_bus_message_exit_container(message) >= 0;
 }

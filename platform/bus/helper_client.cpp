@@ -54,7 +54,7 @@ CommandResult vell::HelperClient::perform(helper::TaskID task, const char* comma
       {kHelperBusName, kHelperPath, kHelperInterface, "Perform",
        [task, command = std::string(command),
         request = std::move(request)](sd_bus_message* message) {
-         return unlessScarce(sd_bus_message_append(message, "u", task)) >= 0 &&
+         return checked(sd_bus_message_append(message, "u", task)) >= 0 &&
                 appendText(message, command) && appendDictionary(message, request);
        }},
       [promise](BusOutcome outcome, sd_bus_message* answer) {

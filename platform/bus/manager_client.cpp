@@ -178,8 +178,8 @@ class vell::client::Manager {
 
   void onConnected(sd_bus* bus) {
     sd_bus_slot* slot = nullptr;
-    if (unlessScarce(sd_bus_match_signal_async(bus, &slot, kBusName, kObjectPath, kInterface,
-                                               "Event", onEvent, nullptr, this)) >= 0) {
+    if (checked(sd_bus_match_signal_async(bus, &slot, kBusName, kObjectPath, kInterface, "Event",
+                                          onEvent, nullptr, this)) >= 0) {
       events.reset(slot);
     }
     const std::string ownerRule =
@@ -187,8 +187,8 @@ class vell::client::Manager {
             "type='signal',sender='org.freedesktop.DBus',interface='org.freedesktop.DBus',"
             "member='NameOwnerChanged',arg0='") +
         kBusName + "'";
-    if (unlessScarce(sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr,
-                                            this)) >= 0) {
+    if (checked(sd_bus_add_match_async(bus, &slot, ownerRule.c_str(), onOwnerChanged, nullptr,
+                                       this)) >= 0) {
       ownerChanges.reset(slot);
     }
     askForOwner();
@@ -209,12 +209,12 @@ class vell::client::Manager {
   void askForOwner() {
     connection.call({kBusDaemon, "/org/freedesktop/DBus", kBusDaemon, "GetNameOwner",
                      [](sd_bus_message* message) {
-                       return unlessScarce(sd_bus_message_append(message, "s", kBusName)) >= 0;
+                       return checked(sd_bus_message_append(message, "s", kBusName)) >= 0;
                      }},
                     [this](BusOutcome outcome, sd_bus_message* reply) {
                       const char* name = nullptr;
                       if (outcome == BusOutcome::answered &&
-                          unlessScarce(sd_bus_message_read(reply, "s", &name)) > 0) {
+                          checked(sd_bus_message_read(reply, "s", &name)) > 0) {
                         owner = name;
                       }
                     });
@@ -234,8 +234,8 @@ class vell::client::Manager {
     }
     connection.call(managerCall("org.freedesktop.DBus.Properties", "Get",
                                 [](sd_bus_message* message) {
-                                  return unlessScarce(sd_bus_message_append(
-                                             message, "ss", kInterface, "ServerState")) >= 0;
+                                  return checked(sd_bus_message_append(message, "ss", kInterface,
+                                                                       "ServerState")) >= 0;
                                 }),
                     [this](BusOutcome outcome, sd_bus_message* reply) {
                       // A former owner may be late; the state of the new one, or of none, is told
@@ -257,7 +257,7 @@ class vell::client::Manager {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* name = nullptr;
     if (!isFrom(signal, manager.owner) || sd_bus_message_has_signature(signal, "sv") <= 0 ||
-        unlessScarce(sd_bus_message_read(signal, "s", &name)) <= 0) {
+        checked(sd_bus_message_read(signal, "s", &name)) <= 0) {
       return 0;
     }
     const auto tell = manager.subscriptions.listener(name);
@@ -272,7 +272,7 @@ class vell::client::Manager {
     auto& manager = *static_cast<Manager*>(userdata);
     const char* newOwner = nullptr;
     if (!isFrom(signal, kBusDaemon) ||
-        unlessScarce(sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner)) <= 0) {
+        checked(sd_bus_message_read(signal, "sss", nullptr, nullptr, &newOwner)) <= 0) {
       return 0;
     }
     manager.owner = newOwner;

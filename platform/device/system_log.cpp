@@ -44,10 +44,8 @@ std::string nativeEntry(const std::string& message) {
 FileDescriptor sealedFile(const std::string& bytes) {
   constexpr int kAllSeals = F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE | F_SEAL_SEAL;
   FileDescriptor file(memfd_create("journal-entry", MFD_CLOEXEC | MFD_ALLOW_SEALING));
-  if (!file) {
-    endIfScarce(errno);
-  }
   if (!file || writeWhole(file.get(), bytes) || fcntl(file.get(), F_ADD_SEALS, kAllSeals) != 0) {
+    endIfScarce(errno);
     return FileDescriptor();
   }
   return file;

@@ -129,12 +129,9 @@ bool JournalFileIterator::read(EntryBatch& batch) {
   batch.begin(current);
   const void* data = nullptr;
   std::size_t length = 0;
-  const auto next = [&] {
-    return unlessScarce(sd_journal_enumerate_data(journal.get(), &data, &length));
-  };
   sd_journal_restart_data(journal.get());
-  int more = next();
-  for (; more > 0; more = next()) {
+  int more = 0;
+  while ((more = checked(sd_journal_enumerate_data(journal.get(), &data, &length))) > 0) {
     addItem({static_cast<const char*>(data), length}, batch);
   }
   const bool whole = !lostPage() && more == 0;
@@ -184,13 +181,13 @@ bool JournalFileIterator::goToFirst() {
 }
 
 bool JournalFileIterator::goToNext() {
-  if (unlessScarce(sd_journal_next(journal.get())) <= 0 ||
+  if (checked(sd_journal_next(journal.get())) <= 0 ||
       sd_journal_get_realtime_usec(journal.get(), &current) < 0) {
     return false;
   }
   latest = std::max(latest, current);
   const bool isLast = current == end.realtime &&
-                      unlessScarce(sd_journal_test_cursor(journal.get(), end.cursor.c_str())) > 0;
+                      checked(sd_journal_test_cursor(journal.get(), end.cursor.c_str())) > 0;
   state = isLast ? State::AtEnd : State::Walking;
   return true;
 }

@@ -10,7 +10,6 @@
 #include <systemd/sd-id128.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
@@ -221,7 +220,7 @@ JournalPtr openJournal(FileDescriptor file) {
   surviveLostPages();
   sd_journal* opened = nullptr;
   int number = file.get();
-  const int result = unlessScarce(sd_journal_open_files_fd(&opened, &number, 1, 0));
+  const int result = checked(sd_journal_open_files_fd(&opened, &number, 1, 0));
   if (result < 0) {
     errno = -result;
     return nullptr;
@@ -241,22 +240,17 @@ bool hasJournalFile(sd_journal* journal) {
 }
 
 std::string whyNotOpened(int error, const FileDescriptor& file) {
-  constexpr std::string_view kSignature = "LPKSHHRH";
-  switch (error) {
-    case EMFILE:
-    case ENFILE:
-      return "given up for want of file descriptors";
-    case EIDRM:
-      return "removed before its turn";
-    case EBADMSG:
-    case ENODATA: {
-      std::array<char, kSignature.size()> start{};
-      const auto length = pread(file.get(), start.data(), start.size(), 0);
-      return length > 0 && std::string_view(start.data(), start.size()) == kSignature
-                 ? "damaged at its head"
-                 : "not a journal";
-    }
-    default:
-      return std::strerror(error);
+  if (error == EMFILE || error == ENFILE) {
+    return "given up for want of file descriptors";
   }
+  if (error == EIDRM) {
+    return "removed before its turn";
+  }
+  if (error != EBADMSG && error != ENODATA) {
+    return std::strerror(error);
+  }
+  const std::string signature = "LPKSHHRH";
+  std::string start(signature.size(), '\0');
+  const auto length = pread(file.get(), start.data(), start.size(), 0);
+  return length > 0 && start == signature ? "damaged at its head" : "not a journal";
 }

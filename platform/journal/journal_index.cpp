@@ -20,16 +20,13 @@ struct Finding {
 bool addWantedValues(sd_journal* journal, JournalField field,
                      const std::function<bool(std::string_view)>& wanted, Finding& finding) {
   const std::string name(kJournalFieldNames[indexOf(field)]);
-  if (unlessScarce(sd_journal_query_unique(journal, name.c_str())) < 0) {
+  if (checked(sd_journal_query_unique(journal, name.c_str())) < 0) {
     return false;
   }
   const void* data = nullptr;
   std::size_t length = 0;
-  const auto next = [&] {
-    return unlessScarce(sd_journal_enumerate_unique(journal, &data, &length));
-  };
-  int more = next();
-  for (; more > 0; more = next()) {
+  int more = 0;
+  while ((more = checked(sd_journal_enumerate_unique(journal, &data, &length))) > 0) {
     const std::string_view match(static_cast<const char*>(data), length);
     finding.hasValues = true;
     if (wanted(match.substr(name.size() + 1))) {
@@ -71,8 +68,8 @@ bool JournalIndex::enable(sd_journal* journal) {
   enabled = std::all_of(matches.begin(), matches.end(), [&](const std::string& match) {
     const auto name = std::string_view(match).substr(0, match.find('='));
     const bool sameField = std::exchange(lastName, name) == name;
-    return (sameField || unlessScarce(sd_journal_add_disjunction(journal)) >= 0) &&
-           unlessScarce(sd_journal_add_match(journal, match.data(), match.size())) >= 0;
+    return (sameField || checked(sd_journal_add_disjunction(journal)) >= 0) &&
+           checked(sd_journal_add_match(journal, match.data(), match.size())) >= 0;
   });
   if (!enabled) {
     disable(journal);

@@ -22,7 +22,7 @@ bool readNumber(std::string_view cursor, char key, std::uint64_t& number) {
 
 std::string cursorOf(sd_journal* journal) {
   char* text = nullptr;
-  if (unlessScarce(sd_journal_get_cursor(journal, &text)) < 0) {
+  if (checked(sd_journal_get_cursor(journal, &text)) < 0) {
     return {};
   }
   const HandlePtr<char, std::free> owner(text);

@@ -3,6 +3,6 @@
 #include "logdump/handlers.h"
 
 int main(int count, char** words) {
-  const bool result = makeOsLogHandler()(WorkGroup(), {words + 1, words + count});
+  const bool result = makeOsLogHandler()(WorkGroup::create(), {words + 1, words + count});
   return result ? 0 : 1;
 }
