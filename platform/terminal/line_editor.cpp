@@ -104,9 +104,6 @@ void forgetSteps() {
 
 /// The next byte that is typed. Below 0 after Ctrl-C, and when none will come.
 int readByte() {
-  if (RL_ISSTATE(RL_STATE_READCMD)) {
-    forgetSteps();
-  }
   pollfd terminal{STDIN_FILENO, POLLIN, 0};
   do {
     const bool wasStopped = rl_pending_signal() == SIGTSTP;
@@ -127,6 +124,9 @@ int readByte() {
 int readUtf8(FILE* /*stream*/) {
   static std::string typed;
   static std::string text;
+  if (RL_ISSTATE(RL_STATE_READCMD)) {
+    forgetSteps();
+  }
   while (text.empty()) {
     const int byte = readByte();
     if (byte < 0) {
