@@ -13,7 +13,7 @@ const char* const kReasonPrefix = "[velltool] ";
 const char* const kDefaultReason = "User triggered";
 
 struct Keyword {
-  const char* word;
+  const char* word = nullptr;
   std::optional<CompressionMode> mode;  ///< Without one: the user is not asked.
 };
 

@@ -80,7 +80,7 @@ TEST(ExportFile, StaysOpenUnderAWriteThatHangsAndTakesNoOther) {
   static std::promise<void> released;
   static int closed = 0;
   struct HangingFile : WritableFile {
-    ~HangingFile() override { ++closed; }
+    const std::shared_ptr<void> closing{nullptr, [](void*) { ++closed; }};
     std::error_code append(std::string_view /*bytes*/) override {
       begun.set_value();  // Throws the second time.
       released.get_future().wait();
