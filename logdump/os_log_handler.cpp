@@ -8,6 +8,7 @@
 #include <iostream>
 #include <iterator>
 #include <limits>
+#include <optional>
 #include <set>
 #include <string>
 #include <system_error>
@@ -109,7 +110,10 @@ WordCompleter makeOsLogCompleter() {
 
 CommandHandler makeOsLogHandler() {
   return [](WorkGroup group, std::list<std::string> args) {
-    const WorkGroup::Membership membership(std::move(group));
+    std::optional<WorkGroup::Membership> membership;
+    if (group) {
+      membership.emplace(std::move(group));
+    }
     return exportOsLog(std::move(args));
   };
 }
