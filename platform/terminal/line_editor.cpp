@@ -59,7 +59,7 @@ char* nextWord(const char* /*typed*/, int isLater) {
     return nullptr;
   }
   const auto& word = completions.words[index];
-  rl_completion_append_character = word.back();
+  rl_completion_append_character = static_cast<unsigned char>(word.back());
   return strndup(word.c_str(), word.size() - 1);
 }
 
