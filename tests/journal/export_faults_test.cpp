@@ -130,9 +130,11 @@ TEST(ExportFailures, GiveUpTheOldestOfMoreFilesThanCanBeOpen) {
   EXPECT_EQ(lastWords(device.run({"-p"}, "ulimit -n 24;")),
             "first " + all.substr(all.find("11 ")) + "last " + kAll +
                 "descriptors descriptors descriptors descriptors descriptors 1 ");
+#ifndef VELL_SANITIZED  // A sanitizer needs descriptors of its own.
   // Not even the journals can be found. Whoever runs the tests may have left files open.
   EXPECT_EQ(device.run({"-p"}, "rm out.txt; exec 3>&- 4>&- 5>&- 6>&- 7>&-; ulimit -n 5;"),
             "velltool: cannot open a file: Too many open files\nstatus 1\n");
+#endif
   // Files that end before the history are not kept open.
   EXPECT_EQ(lastWords(device.run({"-p"}, "H=9000; ulimit -n 24;")), "2 1 last 9000.000000 ");
 }
