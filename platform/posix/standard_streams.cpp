@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <initializer_list>
 #include <iostream>
@@ -50,22 +51,22 @@ class DescriptorBuffer : public std::streambuf {
   std::string unwritten;
 };
 
-/// Reads standard input byte by byte, so that what is behind a line is left to whoever reads next.
-/// Waits where it does not block.
+/// Reads standard input. Waits where it does not block.
 class InputBuffer : public std::streambuf {
  protected:
   int_type underflow() override {
-    ssize_t count = read(STDIN_FILENO, &byte, 1);
-    for (; count < 0 && (errno == EAGAIN || errno == EINTR); count = read(STDIN_FILENO, &byte, 1)) {
+    ssize_t count = read(STDIN_FILENO, bytes.data(), bytes.size());
+    while (count < 0 && (errno == EAGAIN || errno == EINTR)) {
       pollfd waiting{STDIN_FILENO, POLLIN, 0};
       poll(&waiting, 1, -1);
+      count = read(STDIN_FILENO, bytes.data(), bytes.size());
     }
-    setg(&byte, &byte, &byte + std::max<ssize_t>(count, 0));
-    return count > 0 ? traits_type::to_int_type(byte) : traits_type::eof();
+    setg(bytes.data(), bytes.data(), bytes.data() + std::max<ssize_t>(count, 0));
+    return count > 0 ? traits_type::to_int_type(bytes[0]) : traits_type::eof();
   }
 
  private:
-  char byte = 0;
+  std::array<char, 4096> bytes = {};
 };
 
 }  // namespace
