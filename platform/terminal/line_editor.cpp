@@ -1,4 +1,5 @@
 #include "platform/line_reader.h"
+#include "platform/process_end.h"
 #include "platform/terminal/plain_line.h"
 #include "platform/unicode/utf8.h"
 
@@ -31,24 +32,19 @@ const Completer* completer = nullptr;
 Completions completions;                     ///< Of the word at the cursor.
 volatile std::sig_atomic_t interrupted = 0;  ///< By Ctrl-C, since the prompt was written.
 
-char kBreaks[] = "/ \t\n\v\f\r";  ///< Behind a slash or white space.
-
 /// Takes what readline writes, see fopencookie(3). std::cout waits where a terminal has no room.
 ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   std::cout.write(bytes, static_cast<std::streamsize>(count)).flush();
   return static_cast<ssize_t>(count);
 }
 
-/// Has `completions` be what the line up to the cursor can become.
-void lookUpCompletions() {
+/// Has `completions` be what the line up to the cursor can become. Tells readline what is in front
+/// of the word: white space, and in a path a slash.
+char* lookUpCompletions() {
+  static char breaks[] = "/ \t\n\v\f\r";
   completions = (*completer)({rl_line_buffer, static_cast<std::size_t>(rl_point)});
-}
-
-/// Tells readline what is in front of the word to complete: white space, and in a path a slash.
-char* breaksOfWords() {
-  lookUpCompletions();
   const auto start = static_cast<std::size_t>(rl_point) - completions.typed;
-  return kBreaks + (start > 0 && rl_line_buffer[start - 1] == '/' ? 0 : 1);
+  return breaks + (start > 0 && rl_line_buffer[start - 1] == '/' ? 0 : 1);
 }
 
 /// Gives readline the words one by one, the first when it is asked for the first time.
@@ -77,29 +73,31 @@ bool isPastedTab() {
 /// history: readline 8.2 may free these steps in two places. They are kept, as one of them may own
 /// them.
 void forgetSteps() {
-  static rl_command_func_t* const commands[] = {rl_get_previous_history,
-                                                rl_get_next_history,
-                                                rl_beginning_of_history,
-                                                rl_end_of_history,
-                                                rl_fetch_history,
-                                                rl_operate_and_get_next,
-                                                rl_reverse_search_history,
-                                                rl_forward_search_history,
-                                                rl_noninc_reverse_search,
-                                                rl_noninc_forward_search,
-                                                rl_noninc_reverse_search_again,
-                                                rl_noninc_forward_search_again,
-                                                rl_history_search_backward,
-                                                rl_history_search_forward,
-                                                rl_history_substr_search_backward,
-                                                rl_history_substr_search_forward,
-                                                rl_vi_search,
-                                                rl_vi_search_again,
-                                                rl_vi_fetch_history};
+  // clang-format off
+  static rl_command_func_t* const commands[] = {
+      rl_get_previous_history, rl_get_next_history, rl_beginning_of_history, rl_end_of_history,
+      rl_fetch_history, rl_operate_and_get_next, rl_reverse_search_history,
+      rl_forward_search_history, rl_noninc_reverse_search, rl_noninc_forward_search,
+      rl_noninc_reverse_search_again, rl_noninc_forward_search_again, rl_history_search_backward,
+      rl_history_search_forward, rl_history_substr_search_backward,
+      rl_history_substr_search_forward, rl_vi_search, rl_vi_search_again, rl_vi_fetch_history};
+  // clang-format on
   static std::vector<UNDO_LIST*> steps;
   if (rl_undo_list != nullptr && std::ranges::find(commands, rl_last_func) != std::end(commands)) {
     steps.push_back(std::exchange(rl_undo_list, nullptr));
   }
+}
+
+/// Draws the line. On a screen of one row readline 8.2 divides by a third of its columns, so that
+/// it is told of four columns where there are fewer.
+void draw() {
+  int rows = 0;
+  int columns = 0;
+  rl_get_screen_size(&rows, &columns);
+  if (columns < 4) {
+    rl_set_screen_size(rows, 4);
+  }
+  rl_redisplay();
 }
 
 /// The next byte that is typed. Below 0 after Ctrl-C, and when none will come.
@@ -158,7 +156,8 @@ bool prepareEditing() {
   rl_outstream = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
   rl_getc_function = readUtf8;
   rl_change_environment = 0;
-  rl_completion_word_break_hook = breaksOfWords;
+  rl_redisplay_function = draw;
+  rl_completion_word_break_hook = lookUpCompletions;
   rl_completion_entry_function = nextWord;
   // Sequences of keys that mean nothing. What is bound later goes first.
   rl_bind_keyseq("\\e[", rl_skip_csi_sequence);
@@ -202,6 +201,19 @@ void remember(const std::string& line) {
 }
 
 }  // namespace
+
+// readline asks these two for memory. Its own would end the process in another way.
+extern "C" void* xrealloc(void* memory, std::size_t size) {
+  auto* const found = std::realloc(memory, size);
+  if (found == nullptr) {
+    endProcess("out of memory");
+  }
+  return found;
+}
+
+extern "C" void* xmalloc(std::size_t size) {
+  return xrealloc(nullptr, size);
+}
 
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete) {
   static const bool isEditing = prepareEditing();
