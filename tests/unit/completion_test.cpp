@@ -32,7 +32,7 @@ TEST(Completion, OffersWhatTheShellKnows) {
       {"t", "deep route q", "", 1},
       {"t", "tel ", ""},
       {"t", "both ", ""},
-      {"t", "tel -- deep t", "tel  telx  ", 1},
+      {"t", "tel -- nosuch -- deep t", "tel  telx  ", 1},
       {"t", "nosuch deep -- ", atRoot + builtIn + "quit  tel  "},
       {"t", "cd ", "both/ deep/ "},
       {"deep", "cd ", "route/ "},
