@@ -122,17 +122,23 @@ int readByte() {
 int readUtf8(FILE* /*stream*/) {
   static std::string typed;
   static std::string text;
+  static bool hasEnded = false;
   if (RL_ISSTATE(RL_STATE_READCMD)) {
     forgetSteps();
   }
   while (text.empty()) {
     const int byte = readByte();
-    if (byte < 0) {
+    if (byte >= 0) {
+      typed += static_cast<char>(byte);
+      text = takeUtf8(typed);
+    } else if (!hasEnded && RL_ISSTATE(RL_STATE_MOREINPUT)) {
+      text =
+          "\x1b[201~";  // Ends a paste: of one without an end, readline reads more than there is.
+    } else {
       typed.clear();
       return byte;
     }
-    typed += static_cast<char>(byte);
-    text = takeUtf8(typed);
+    hasEnded = byte < 0;
   }
   const auto byte = static_cast<unsigned char>(text.front());
   text.erase(0, 1);
