@@ -44,17 +44,12 @@ LAST = "state, property and event agree"  # in the end of the manager, too
 root = os.environ.get("VELL_SYSROOT", "")
 
 
-# A promise is broken: what came.
-class Broken(Exception):
-    pass
-
-
 # There is nothing to see a promise by: why.
 class Skipped(Exception):
     pass
 
 
-def expect(condition, otherwise, kind=Broken):
+def expect(condition, otherwise, kind=ValueError):
     if not condition:
         raise kind(otherwise)
 
@@ -85,8 +80,11 @@ def connect():
 
 # A file in the syntax of os-release(5).
 def settings(path):
-    with open(root + path, encoding="utf-8") as file:
-        return dict(word.split("=", 1) for word in shlex.split(file.read(), comments=True) if "=" in word)
+    with open(root + path, encoding="utf-8", errors="replace") as file:
+        text = file.read()
+    with contextlib.suppress(ValueError):
+        return dict(word.split("=", 1) for word in shlex.split(text, comments=True) if "=" in word)
+    raise ValueError(f"{root}{path} is not in the syntax of os-release(5): {text}")
 
 
 # The value of a trace property as velltool reads it; None where it is missing or cannot be read.
@@ -270,7 +268,7 @@ def promise(what, heading, words):
     except Skipped as reason:
         skipped = f" # SKIP {reason}"
     except Exception as error:
-        came = str(error)[:400]
+        came = " ".join(str(error).split())[:400]  # In one line of TAP.
     if came and not owner:
         came, skipped = None, " # SKIP the manager has ended"
     results.append(not came)
@@ -326,8 +324,7 @@ def run():
         live = f"{root}{LIVE_TRACES}{manager.ending('live')}.scratch"
         expect(os.path.isdir(live), f"no directory {live}")
     with promise("two clients at a time are answered", members, "several may run at a time"):
-        calls = [manager.ask(ENABLED, each) for each in (client, other) * 5]
-        answers = {str(call.refusal() or call.reply) for call in calls}
+        answers = {str(call.refusal() or call.reply) for call in [manager.ask(ENABLED, of) for of in [client, other] * 5]}
         expect(len(answers) == 1, f"different answers: {answers}")
     for what in "tel", "core", "bb":
         for packing, how in (0, "not packed"), (1, "as a tar.gz"), (2, "as a tar"):
