@@ -6,7 +6,6 @@
 
 #include <csignal>
 #include <fstream>
-#include <list>
 
 namespace {
 
@@ -19,6 +18,7 @@ const std::string kToolAndStatus = "tool=trap : INT; velltool; echo $? $(stty -g
 constexpr std::chrono::seconds kStart(60);  ///< For a process to begin.
 
 const std::string kProfile = "RADIO_TYPE=1\nMANAGER=absent\nTIMESTAMP=T\n";
+
 /// The processes that a process has started.
 std::string childrenOf(const std::string& process) {
   return std::to_string(
@@ -253,29 +253,4 @@ TEST(LineEditing, GoesOnWhereItWasStopped) {
   screen.expect(shown += "\n^C\n$ ");
   screen.type("'echo $?' Enter");
   screen.expect(shown + "echo $?\n130\n$ ");
-}
-
-TEST(LineEditing, GivesWhatLinesFromAPipeGive) {
-  const SimulatedDevice device("RADIO_TYPE=1\nMANAGER=absent");
-  const std::list<std::string> lines = {"logdump bb", "-- nosuch -- help", "cd logdump",
-                                        "tel",        "cd .. -- cd x",     "quit"};
-  std::string input;
-  std::string keys;
-  for (const auto& line : lines) {
-    input += line + "\n";
-    keys += " '" + line + "' Enter";
-  }
-  const auto* const piped =
-      R"(export "$1"; velltool <<< "$2" 2>&1 | expand | sed $'s/\e[^m]*m//g')";
-  auto expected = device.runLine(piped, {kSearchPath, input}).output;
-  // A terminal shows each line behind its prompt.
-  std::size_t prompt = 0;
-  for (const auto& line : lines) {
-    prompt = expected.find(">> ", prompt) + 3;
-    expected.insert(prompt, line + "\n");
-  }
-  Screen screen(device);
-  screen.startTool();
-  screen.type(keys);
-  screen.expect(expected + "$ ");
 }
