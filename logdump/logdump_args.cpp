@@ -48,17 +48,13 @@ void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::
 }
 
 WordCompleter completeLogdumpArgs(bool nonui) {
-  return [nonui](const std::list<std::string>& before, const std::string& typed) {
-    std::set<std::string> words;
+  return [nonui](const std::list<std::string>& before, const std::string& /*typed*/) {
+    std::set<std::string> words{"--"};
     const bool hasReason = !std::ranges::all_of(before, findKeyword);
     for (const auto& [word, mode] : kKeywords) {
       if (!hasReason && (nonui || mode)) {
         words.insert(word);
       }
-    }
-    // Behind a reason it is all that can follow, and comes when it is begun.
-    if (!hasReason || !typed.empty()) {
-      words.insert("--");
     }
     return words;
   };

@@ -23,6 +23,7 @@ using Completer = std::function<Completions(const std::string& text)>;
 /// inputrc says for "velltool": Tab asks `complete`, the process's earlier lines come back, Ctrl-C
 /// gives up the line and begins another, and what is no UTF-8 is taken for U+FFFD. Several lines
 /// that were entered at once come one by one. During the call the terminal is set for editing; it
-/// is as it was found whenever a signal stops or ends the process, and after std::quick_exit. Other
-/// threads have to block signals. All calls are from the same thread.
+/// is as it was found after std::quick_exit, and when a signal that people send (readline catches
+/// INT, TERM, HUP, QUIT, ALRM and those of job control) stops or ends the process. Other threads
+/// have to block signals. All calls are from the same thread.
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete);

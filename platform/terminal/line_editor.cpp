@@ -59,31 +59,23 @@ char* nextWord(const char* /*typed*/, int isLater) {
   return strndup(word.c_str(), word.size() - 1);
 }
 
-/// Whether Tab parts words: behind one that it does not complete, with more to come. A terminal
-/// that does not mark what is pasted gives it so.
+/// Whether Tab parts words: with more to come, behind a word that it does not complete, or where it
+/// would begin one. A terminal that does not mark what is pasted gives it so.
 bool isPastedTab() {
   int waiting = 0;
   ioctl(STDIN_FILENO, FIONREAD, &waiting);
   lookUpCompletions();
   const auto& [typed, words] = completions;
-  return waiting > 0 && typed > 0 && (words.empty() || words.front()[typed] != words.back()[typed]);
+  return waiting > 0 &&
+         (typed > 0 ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
 }
 
-/// Has what was done to the line so far not be undone once a command has looked through the
-/// history: readline 8.2 may free these steps in two places. They are kept, as one of them may own
-/// them.
+/// Has what was done to the line so far not be undone once a command has gone through the history:
+/// readline 8.2 may free these steps in two places. They are kept, as one of them may own them.
 void forgetSteps() {
-  // clang-format off
-  static rl_command_func_t* const commands[] = {
-      rl_get_previous_history, rl_get_next_history, rl_beginning_of_history, rl_end_of_history,
-      rl_fetch_history, rl_operate_and_get_next, rl_reverse_search_history,
-      rl_forward_search_history, rl_noninc_reverse_search, rl_noninc_forward_search,
-      rl_noninc_reverse_search_again, rl_noninc_forward_search_again, rl_history_search_backward,
-      rl_history_search_forward, rl_history_substr_search_backward,
-      rl_history_substr_search_forward, rl_vi_search, rl_vi_search_again, rl_vi_fetch_history};
-  // clang-format on
+  static int place = 0;
   static std::vector<UNDO_LIST*> steps;
-  if (rl_undo_list != nullptr && std::ranges::find(commands, rl_last_func) != std::end(commands)) {
+  if (std::exchange(place, where_history()) != where_history() && rl_undo_list != nullptr) {
     steps.push_back(std::exchange(rl_undo_list, nullptr));
   }
 }
@@ -91,11 +83,10 @@ void forgetSteps() {
 /// Draws the line. On a screen of one row readline 8.2 divides by a third of its columns, so that
 /// it is told of four columns where there are fewer.
 void draw() {
-  int rows = 0;
   int columns = 0;
-  rl_get_screen_size(&rows, &columns);
+  rl_get_screen_size(nullptr, &columns);
   if (columns < 4) {
-    rl_set_screen_size(rows, 4);
+    rl_set_screen_size(0, 4);
   }
   rl_redisplay();
 }
@@ -104,9 +95,12 @@ void draw() {
 int readByte() {
   pollfd terminal{STDIN_FILENO, POLLIN, 0};
   do {
-    const bool wasStopped = rl_pending_signal() == SIGTSTP;
+    const int pending = rl_pending_signal();
+    if (pending == SIGWINCH) {
+      rl_clear_visible_line();  // readline would do that if it did not call `draw`.
+    }
     rl_check_signals();
-    if (wasStopped) {
+    if (pending == SIGTSTP) {
       rl_forced_update_display();
     }
   } while (interrupted == 0 && poll(&terminal, 1, -1) < 0);
@@ -122,32 +116,24 @@ int readByte() {
 int readUtf8(FILE* /*stream*/) {
   static std::string typed;
   static std::string text;
-  static bool hasEnded = false;
+  static bool isEnded = false;
   if (RL_ISSTATE(RL_STATE_READCMD)) {
     forgetSteps();
   }
   while (text.empty()) {
     const int byte = readByte();
-    if (byte >= 0) {
-      typed += static_cast<char>(byte);
-      text = takeUtf8(typed);
-    } else if (!hasEnded && RL_ISSTATE(RL_STATE_MOREINPUT)) {
-      text =
-          "\x1b[201~";  // Ends a paste: of one without an end, readline reads more than there is.
-    } else {
+    if (byte < 0) {
       typed.clear();
-      return byte;
+      // readline takes a paste that is broken off for a string. This ends it.
+      isEnded = !isEnded && RL_ISSTATE(RL_STATE_MOREINPUT);
+      return isEnded ? '\0' : byte;
     }
-    hasEnded = byte < 0;
+    typed += static_cast<char>(byte);
+    text = takeUtf8(typed);
   }
   const auto byte = static_cast<unsigned char>(text.front());
   text.erase(0, 1);
   return byte;
-}
-
-/// Takes the byte behind the beginning of a key's sequence.
-int skipByte(int /*count*/, int /*key*/) {
-  return rl_read_key() < 0 ? 1 : 0;
 }
 
 /// Sets readline up, once; false where lines are not to be edited.
@@ -162,20 +148,18 @@ bool prepareEditing() {
   rl_outstream = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
   rl_getc_function = readUtf8;
   rl_change_environment = 0;
-  rl_redisplay_function = draw;
   rl_completion_word_break_hook = lookUpCompletions;
   rl_completion_entry_function = nextWord;
   // Sequences of keys that mean nothing. What is bound later goes first.
-  rl_bind_keyseq("\\e[", rl_skip_csi_sequence);
-  rl_bind_keyseq("\\e[[", skipByte);
-  rl_bind_keyseq("\\eO", skipByte);
-  rl_initialize();
-  // readline has asked the environment whether there are other bytes than ASCII. The person's own
-  // settings, which may say something else, go last.
+  for (const auto* begin : {"\\e[", "\\e[[", "\\eO", "\\e\\e[", "\\e\\eO"}) {
+    rl_bind_keyseq(begin, rl_skip_csi_sequence);
+  }
+  // Whatever the environment says of the bytes, or does not. The person's own settings go last.
   rl_variable_bind("input-meta", "on");
   rl_variable_bind("output-meta", "on");
   rl_variable_bind("convert-meta", "off");
-  rl_re_read_init_file(0, 0);
+  rl_initialize();
+  rl_redisplay_function = draw;  // Not before: readline would take the terminal for a dumb one.
   stifle_history(1000);
   return std::at_quick_exit(rl_deprep_terminal) == 0;
 }
