@@ -9,6 +9,9 @@
 /// Ends the process if the errno `error` says that memory or file descriptors have run out.
 void endIfScarce(int error);
 
+/// Ends the process if it finds no memory now, not even for a MiB.
+void endWithoutMemory();
+
 /// What a library returned, a negative errno after a failure; ends the process as `endIfScarce`
 /// does. Such a failure tells nothing of what was asked.
 inline int checked(int result) {

@@ -5,9 +5,9 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <functional>
 #include <string>
 #include <system_error>
-#include <vector>
 
 namespace {
 
@@ -35,14 +35,13 @@ Process lookAt(const fs::path& folder) {
   return process;
 }
 
-std::vector<Process> processes() {
-  std::vector<Process> found;
+/// Whether `holds` for a process; it is not called again once it does.
+bool anyProcess(const std::function<bool(const Process&)>& holds) {
+  bool found = false;
   std::error_code error;
-  for (fs::directory_iterator entry(sysroot() / "proc", error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (isProcessFolder(entry->path())) {
-      found.push_back(lookAt(entry->path()));
-    }
+  for (fs::directory_iterator entry(sysroot() / "proc", error), end;
+       !error && !found && entry != end; entry.increment(error)) {
+    found = isProcessFolder(entry->path()) && holds(lookAt(entry->path()));
   }
   endIfScarce(error.value());
   return found;
@@ -51,7 +50,7 @@ std::vector<Process> processes() {
 }  // namespace
 
 bool processRunning(const std::string& name) {
-  return std::ranges::any_of(processes(), [&](const Process& process) {
+  return anyProcess([&](const Process& process) {
     return process.command == name || process.executable == name;
   });
 }
@@ -59,12 +58,13 @@ bool processRunning(const std::string& name) {
 std::set<std::string> processNames() {
   constexpr std::size_t kCutLength = 15;
   std::set<std::string> names;
-  for (const auto& process : processes()) {
+  anyProcess([&](const Process& process) {
     names.insert(process.executable);
     if (process.command.size() < kCutLength) {
       names.insert(process.command);
     }
-  }
+    return false;
+  });
   names.erase("");
   return names;
 }

@@ -125,14 +125,26 @@ JournalFileIterator::Answer JournalFileIterator::askIndex(const LogSelection& se
   return found ? Answer::Walk : Answer::Damaged;
 }
 
-bool JournalFileIterator::read(EntryBatch& batch) {
-  batch.begin(current);
+/// Adds an entry with the items of the current one. Returns 0, or the library's failure.
+int JournalFileIterator::readItems(EntryBatch& batch) {
   const void* data = nullptr;
   std::size_t length = 0;
-  sd_journal_restart_data(journal.get());
   int more = 0;
-  while ((more = checked(sd_journal_enumerate_data(journal.get(), &data, &length))) > 0) {
+  batch.begin(current);
+  sd_journal_restart_data(journal.get());
+  while ((more = sd_journal_enumerate_data(journal.get(), &data, &length)) > 0) {
     addItem({static_cast<const char*>(data), length}, batch);
+  }
+  return more;
+}
+
+bool JournalFileIterator::read(EntryBatch& batch) {
+  int more = readItems(batch);
+  if (more == -ENOMEM) {
+    // This comes of a damaged compressed value, too.
+    endWithoutMemory();
+    batch.dropLast();
+    more = readItems(batch);
   }
   const bool whole = !lostPage() && more == 0;
   if (!whole) {

@@ -68,6 +68,7 @@ class JournalFileIterator {
   bool isEndOfFile();
   bool goToFirst();
   bool goToNext();
+  int readItems(EntryBatch& batch);
   void goOnWithoutIndex(std::uint64_t left);
   void close(const char* cause);
   void note(const char* cause);

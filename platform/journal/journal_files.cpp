@@ -49,7 +49,7 @@ bool isJournalFolder(const std::string& name) {
     return false;
   }
   return !isLocalMachine() ||
-         (sd_id128_get_machine(&machine) >= 0 && sd_id128_equal(folder, machine) != 0);
+         (checked(sd_id128_get_machine(&machine)) >= 0 && sd_id128_equal(folder, machine) != 0);
 }
 
 /// A tilde marks a file that was not closed in good order.

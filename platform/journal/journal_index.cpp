@@ -4,6 +4,7 @@
 #include "platform/process_end.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <functional>
 #include <string_view>
 #include <utility>
@@ -26,12 +27,15 @@ bool addWantedValues(sd_journal* journal, JournalField field,
   const void* data = nullptr;
   std::size_t length = 0;
   int more = 0;
-  while ((more = checked(sd_journal_enumerate_unique(journal, &data, &length))) > 0) {
+  while ((more = sd_journal_enumerate_unique(journal, &data, &length)) > 0) {
     const std::string_view match(static_cast<const char*>(data), length);
     finding.hasValues = true;
     if (wanted(match.substr(name.size() + 1))) {
       finding.matches.emplace_back(match);
     }
+  }
+  if (more == -ENOMEM) {
+    endWithoutMemory();  // This comes of a damaged compressed value, too.
   }
   return more == 0;
 }

@@ -88,9 +88,7 @@ void LogReader::Session::stop() {
 }
 
 void LogReader::Session::release() {
-  if (!ended) {
-    stop();
-  }
+  stop();
   if (delivering.joinable() && ended) {
     delivering.join();
   } else if (delivering.joinable()) {

@@ -1,5 +1,8 @@
 #include "platform/journal/machine_time_zone.h"
 
+#include "platform/process_end.h"
+
+#include <cerrno>
 #include <cstdint>
 #include <ctime>
 #include <ratio>
@@ -19,7 +22,9 @@ std::chrono::seconds askLibrary(std::chrono::sys_seconds time) {
 }  // namespace
 
 MachineTimeZone::MachineTimeZone() {
-  tzset();
+  errno = 0;
+  tzset();  // Takes a zone that it cannot read for UTC.
+  endIfScarce(errno);
 }
 
 std::chrono::seconds MachineTimeZone::offsetAt(std::chrono::sys_seconds time) const {

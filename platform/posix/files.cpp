@@ -2,10 +2,12 @@
 
 #include "platform/posix/file_descriptor.h"
 #include "platform/posix/whole_write.h"
+#include "platform/process_end.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <cerrno>
 #include <chrono>
 #include <utility>
 
@@ -22,7 +24,11 @@ FileDescriptor openForWriting(const std::string& path, int flags) {
   if (path.find('\0') != std::string::npos) {
     return FileDescriptor();
   }
-  return FileDescriptor(open(path.c_str(), kWriting | flags, kOwnerAlone));
+  FileDescriptor file(open(path.c_str(), kWriting | flags, kOwnerAlone));
+  if (!file) {
+    endIfScarce(errno);
+  }
+  return file;
 }
 
 /// With O_APPEND every write(2) moves to the end of the file first, in the one call.

@@ -8,7 +8,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 
 int readRegularFile(const std::filesystem::path& path, std::size_t most, std::string& text) {
@@ -21,16 +20,17 @@ int readRegularFile(const std::filesystem::path& path, std::size_t most, std::st
   if (!S_ISREG(status.st_mode)) {
     return EINVAL;
   }
-  std::array<char, 4096> part{};
-  for (text.clear(); text.size() < most;) {
-    const auto count = read(file.get(), part.data(), std::min(part.size(), most - text.size()));
-    if (count < 0 && errno != EINTR) {
-      return errno;
-    }
-    if (count == 0) {
-      break;
-    }
-    text.append(part.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+  text.resize(most);
+  std::size_t length = 0;
+  ssize_t count = 1;
+  while (count > 0 && length < most) {
+    count = read(file.get(), text.data() + length, most - length);
+    length += static_cast<std::size_t>(std::max<ssize_t>(count, 0));
+  }
+  text.resize(length);
+  if (count < 0) {
+    endIfScarce(errno);
+    return errno;
   }
   return 0;
 }

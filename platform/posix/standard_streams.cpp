@@ -55,11 +55,11 @@ class DescriptorBuffer : public std::streambuf {
 class InputBuffer : public std::streambuf {
  protected:
   int_type underflow() override {
-    ssize_t count = read(STDIN_FILENO, bytes.data(), bytes.size());
-    while (count < 0 && (errno == EAGAIN || errno == EINTR)) {
+    ssize_t count = 0;
+    while ((count = read(STDIN_FILENO, bytes.data(), bytes.size())) < 0 &&
+           (errno == EAGAIN || errno == EINTR)) {
       pollfd waiting{STDIN_FILENO, POLLIN, 0};
       poll(&waiting, 1, -1);
-      count = read(STDIN_FILENO, bytes.data(), bytes.size());
     }
     setg(bytes.data(), bytes.data(), bytes.data() + std::max<ssize_t>(count, 0));
     return count > 0 ? traits_type::to_int_type(bytes[0]) : traits_type::eof();

@@ -25,6 +25,19 @@
 #include <readline/history.h>
 #include <readline/readline.h>
 
+// readline asks these two for memory. Its own would end the process in another way.
+extern "C" void* xrealloc(void* memory, std::size_t size) {
+  auto* const found = std::realloc(memory, size);
+  if (found == nullptr) {
+    endProcess("out of memory");
+  }
+  return found;
+}
+
+extern "C" void* xmalloc(std::size_t size) {
+  return xrealloc(nullptr, size);
+}
+
 namespace {
 
 // readline keeps its state in variables, and calls back on the thread that reads.
@@ -56,7 +69,9 @@ char* nextWord(const char* /*typed*/, int isLater) {
   }
   const auto& word = completions.words[index];
   rl_completion_append_character = static_cast<unsigned char>(word.back());
-  return strndup(word.c_str(), word.size() - 1);
+  auto* const copy = static_cast<char*>(xmalloc(word.size()));
+  copy[word.copy(copy, word.size() - 1)] = '\0';
+  return copy;
 }
 
 /// Whether Tab parts words: with more to come, behind a word that it does not complete, or where it
@@ -191,19 +206,6 @@ void remember(const std::string& line) {
 }
 
 }  // namespace
-
-// readline asks these two for memory. Its own would end the process in another way.
-extern "C" void* xrealloc(void* memory, std::size_t size) {
-  auto* const found = std::realloc(memory, size);
-  if (found == nullptr) {
-    endProcess("out of memory");
-  }
-  return found;
-}
-
-extern "C" void* xmalloc(std::size_t size) {
-  return xrealloc(nullptr, size);
-}
 
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete) {
   static const bool isEditing = prepareEditing();
