@@ -175,6 +175,12 @@ TEST(LineEditing, ShowsWhatIsTyped) {
   screen.resize("17");
   screen.type("C-l '|'");
   screen.expect("(/velltool)>> 漢\n漢漢字字字字字字\n字字漢漢漢漢漢漢\n漢|漢字");
+  screen.type("C-e C-u C-l 'goes by the screen'");
+  screen.expect("(/velltool)>> goe\ns by the screen");
+  screen.resize("40");
+  screen.expect(kPrompt + "goes by the screen");
+  screen.resize("20");
+  screen.expect("(/velltool)>> goes b\ny the screen");
 }
 
 TEST(LineEditing, IsLeftOutWhereItCannotBeDone) {
