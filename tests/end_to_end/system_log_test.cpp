@@ -35,12 +35,14 @@ while True: log.send(b"PRIORITY=3\nMESSAGE=full\n", MSG_DONTWAIT)')";
               std::vector{path + ":1: RADIO_TYPE: '" + value + "' is not an integer"});
 
     // Nobody takes these away.
-    const auto start = std::chrono::steady_clock::now();
     EXPECT_EQ(device.runLine(fill).status, 1);
-    EXPECT_EQ(helpWith(line, "RADIO_TYPE=1\nPRODUCT_CODE=58\nnonsense\nnonsense\n"), 0);
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(
+        helpWith(line, "RADIO_TYPE=1\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\nx\n"),
+        0);
     const auto taken = std::chrono::steady_clock::now() - start;
     EXPECT_GE(taken, std::chrono::seconds(1));
-    EXPECT_LT(taken, std::chrono::seconds(10));
+    EXPECT_LT(taken, std::chrono::seconds(15));
     EXPECT_EQ(log.messages().at(0), "full");
   }
 }
