@@ -3,6 +3,7 @@
 end it. SIGUSR1 switches the baseband trace on and off, for want of a radio that has one."""
 
 import concurrent.futures
+import contextlib
 import datetime
 import os
 import shlex
@@ -35,11 +36,11 @@ SAVED_TRACES = ROOT + "/var/lib/vell/traces.conf"
 FAILED, NOT_RUNNING = 1, 0xE020E001 - 2**32
 
 
-try:
-    with open(ROOT + "/etc/vell/device.conf", encoding="utf-8") as file:  # See os-release(5).
-        profile = dict(word.split("=", 1) for word in shlex.split(file.read(), comments=True))
-except (OSError, ValueError):
-    profile = {}
+profile = {}
+with contextlib.suppress(OSError), open(ROOT + "/etc/vell/device.conf", encoding="utf-8", errors="replace") as file:
+    for line in file:  # See os-release(5). A line that cannot be read costs that line alone.
+        with contextlib.suppress(ValueError):
+            profile.update(word.split("=", 1) for word in shlex.split(line, comments=True))
 vendor2 = profile.get("RADIO_VENDOR") == "2"
 high = profile.get("RADIO_DIAG_QDSS") == "yes"
 # What a collection consists of, by the ends of the folders' names.

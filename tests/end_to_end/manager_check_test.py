@@ -21,11 +21,20 @@ PROFILES = {
     "TRACE_DUMP_STATE.CollectBasebandLogs=restart": [20],
     "TRACE_DUMP_STATE.CollectTelephonyLogsWithCoredump=silent": [17],
     "TRACE_DUMP_STATE=status:5": [*range(14, 26)], "TIMESTAMP_TYPE=integer": [*range(14, 26)],
-    "TIMESTAMP=": [*range(14, 26)]}
+    "TIMESTAMP='a b'": [*range(14, 26)], "TIMESTAMP=T": [*range(15, 27)]}
 # What in the example becomes what, and what is found on that manager.
 CHANGES = [
-    ("", "", []), ('access="read"', 'access="readwrite"', [4]),
-    ("bus.register_object(", "GLib.timeout_add(200, bus.register_object, ", [1]),
+    ("", "", []), ("tion.return_value(None)", "tion.return_dbus_error('a.b', '')", [5]),
+    ("<property ", '<property name="NoSuchProperty" type="s" access="read"/><property ', [9]),
+    ('== "GetTraceProperty" and', '== "GetTraceProperty" and len(request) == 2 and', [10]),
+    ('"s", traces[trace])', '"s", str(time.time_ns()))', [10, 11, 13]),
+    ("    with one_at", "    request.get('TraceDumpStateReason', '')[65536:] and int('')\n    with one_at", [23]),
+    ("    with one_at", "    request.get('TraceDumpStateReason', '').encode('ascii')\n    with one_at", [24]),
+    ("bus.emit_signal(", "workers.submit(time.sleep, .5); print(", [28]),
+    ('== "GetTraceProperty" and', '== "GetTraceProperty" and next(globals().setdefault("asked", iter([0])), 1) and', [6]),
+    ("    timestamp = now", "    time.sleep(.6)\n    timestamp = now", []),
+    ('access="read"', 'access="readwrite"', [4]),
+    ("bus.register_object(", "GLib.timeout_add(200, bus.register_object, ", [1, 6]),
     ("    invocation.return_value(GLib", "    status == 1 or invocation.return_value(GLib", [9]),
     ("save_traces(), ", "", [11, 12]), ('"w:gz" if', '"w" if', [15, 18, 21]), ('"-qdss"', '"-diag"', [20]),
     ("    return time", "    threading.Timer(.2, os.utime, [COLLECTIONS + made[0]]).start()\n    return time", [26]),
