@@ -30,9 +30,6 @@ TEST(ExportFailures, TellWhatTheJournalOrTheFileIsNotFitFor) {
       {"rm $J/system.journal", closed("No journal files were found")},
       {"yes | head -c 9999 >$J/system.journal", closed("system.journal: not a journal")},
       {"truncate -s 5000 $J/system.journal", closed("system.journal: damaged at its head")},
-      // The size of a compressed value: the library calls it a lack of memory.
-      {R"(LC_ALL=C sed -i 's/\x28\xb5\x2f\xfd./\x28\xb5\x2f\xfd\xe0/' $J/system.journal)",
-       incomplete("system.journal: has a damaged entry") + "600\n"},
       {"chmod 0 $J/system.journal", closed("system.journal: Permission denied")},
       {"chmod 0 $J", closed(kJournals.filename().string() + ": Permission denied")},
       {"cp $J/system.journal $J/a.journal; chmod 0 $J/a.journal",
@@ -53,6 +50,9 @@ TEST(ExportFailures, TellWhatTheJournalOrTheFileIsNotFitFor) {
       {"mkfifo out.txt; head -c 1 out.txt >first & exec 3>out.txt",
        notWritten + "Broken pipe\nstatus 1\n"},
 #ifndef VELL_SANITIZED
+      // A damaged size, which is allocated: a sanitizer ends the process then.
+      {R"(LC_ALL=C sed -i 's/\x28\xb5\x2f\xfd./\x28\xb5\x2f\xfd\xe0/' $J/system.journal)",
+       incomplete("system.journal: has a damaged entry") + "600\n"},
       // Ten seconds in all, however often there is room for a little.
       {"mkfifo out.txt; exec 3<>out.txt; for n in {1..8}; do sleep 1.5; head -c 4096 <&3; done >first & :",
        notWritten + "Connection timed out\nstatus 1\n"},
