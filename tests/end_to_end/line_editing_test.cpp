@@ -72,8 +72,7 @@ class Screen {
   void expect(const std::string& rows, std::chrono::seconds patience = std::chrono::seconds(2)) {
     auto shown = capture();
     while (shown != rows && tmux.hasMore(patience)) {
-      tmux.readSome();
-      shown = capture();
+      shown = capture();  // Reads what else has come, too.
     }
     EXPECT_EQ(shown, rows);
   }
