@@ -79,6 +79,8 @@ def Answer(self, what, status, reply):
 @dbus.service.method(MOCK_IFACE, in_signature="ss")
 def Fail(self, what, error):
     """Has `what` answered with the D-Bus error of that name; "" ends it."""
+    if error:
+        dbus.validate_error_name(error)
     self.errors[what] = error
 
 
