@@ -23,7 +23,7 @@ int readRegularFile(const std::filesystem::path& path, std::size_t most, std::st
   text.resize(most);
   std::size_t length = 0;
   ssize_t count = 1;
-  while (count > 0 && length < most) {
+  while ((count > 0 || (count < 0 && errno == EINTR)) && length < most) {
     count = read(file.get(), text.data() + length, most - length);
     length += static_cast<std::size_t>(std::max<ssize_t>(count, 0));
   }
