@@ -1,6 +1,5 @@
 #include "logdump/os_log_stream.h"
 
-#include "logdump/export_file.h"
 #include "logdump/os_log_line.h"
 #include "platform/clock.h"
 #include "platform/files.h"
@@ -9,8 +8,10 @@
 #include "platform/work_group.h"
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <memory>
+#include <system_error>
 #include <utility>
 
 namespace {
@@ -36,14 +37,13 @@ std::unique_ptr<LogReader> prepareReader() {
   return reader;
 }
 
-std::shared_ptr<ExportFile> createFile(const std::string& path) {
+std::unique_ptr<WritableFile> createFile(const std::string& path) {
   createEmptyFile(path);
-  auto opened = WritableFile::open(path);
-  if (opened == nullptr) {
+  auto file = WritableFile::open(path);
+  if (file == nullptr) {
     logSystemError("Failed to create file: " + path);
-    return nullptr;
   }
-  return std::make_shared<ExportFile>(path, std::move(opened));
+  return file;
 }
 
 WorkGroup createGroup() {
@@ -65,17 +65,26 @@ LogFilter makeFilter(std::vector<std::string> process, std::vector<std::string> 
   return filter;
 }
 
-/// One export under way: what the reader's handlers and the thread that waits for them share.
+enum class Outcome { none, complete, failed, timedOut };
+
+/// What the reader's handlers share. It is on the reader's thread from its first entry to its end,
+/// so that the file may take its time: nobody waits for it longer than for an export.
 class Export {
  public:
-  Export(std::shared_ptr<ExportFile> output, WorkGroup joined)
-      : file(std::move(output)), group(std::move(joined)) {
+  Export(std::string filePath, std::unique_ptr<WritableFile> opened, WorkGroup joined,
+         std::shared_ptr<std::atomic<Outcome>> shared)
+      : path(std::move(filePath)),
+        file(std::move(opened)),
+        group(std::move(joined)),
+        outcome(std::move(shared)) {
     group.enter();
   }
 
   void handleEntry(const LogEntry& entry) {
-    if (entry.type == kLogEntryMessage && !file->append(formatOsLogLine(entry))) {
-      leave();
+    if (entry.type == kLogEntryMessage && *outcome == Outcome::none) {
+      if (const auto error = file->append(formatOsLogLine(entry))) {
+        end(error);
+      }
     }
   }
 
@@ -83,20 +92,25 @@ class Export {
     if (reason != kLogReaderAtEnd) {
       logSystemError("Invalid oslog stream: reason = " + std::to_string(reason));
     }
-    leave();
+    if (*outcome == Outcome::none) {
+      end(file->close());
+    }
   }
 
  private:
   /// Lets the waiting thread go on, because nothing more will be written.
-  void leave() {
-    if (!std::exchange(left, true)) {
-      group.leave();
+  void end(const std::error_code& error) {
+    if (error) {
+      logSystemError("Failed to write file: " + path + ": " + error.message());
     }
+    *outcome = error ? Outcome::failed : Outcome::complete;
+    group.leave();
   }
 
-  const std::shared_ptr<ExportFile> file;
+  const std::string path;
+  const std::unique_ptr<WritableFile> file;
   const WorkGroup group;
-  bool left = false;  ///< On the reader's thread.
+  const std::shared_ptr<std::atomic<Outcome>> outcome;
 };
 
 /// When an export of the last `history` seconds starts.
@@ -115,7 +129,7 @@ bool OsLogStream::putOsLogStreamToFile(std::string path, std::vector<std::string
   if (reader == nullptr) {
     return false;
   }
-  const auto file = createFile(path);
+  auto file = createFile(path);
   if (file == nullptr) {
     return false;
   }
@@ -129,17 +143,20 @@ bool OsLogStream::putOsLogStreamToFile(std::string path, std::vector<std::string
     reader->setFilter(std::move(filter));
   }
   const auto start = startOf(history);
-  const auto running = std::make_shared<Export>(file, group);
+  const auto outcome = std::make_shared<std::atomic<Outcome>>(Outcome::none);
+  auto running = std::make_shared<Export>(std::move(path), std::move(file), group, outcome);
   reader->setEntryHandler([running](const LogEntry& entry) { running->handleEntry(entry); });
-  reader->setInvalidationHandler([running](unsigned long reason, LogTime /*position*/) {
-    running->handleInvalidation(reason);
-  });
+  reader->setInvalidationHandler(
+      [running = std::move(running)](unsigned long reason, LogTime /*position*/) {
+        running->handleInvalidation(reason);
+      });
   logSystemError("Getting oslog stream: history = " + std::to_string(history));
   reader->activate(start);
   const bool ended = group.waitFor(kLongestExport);
   if (!ended) {
+    *outcome = Outcome::timedOut;
     reader->invalidate();
     logSystemError("Timeout on getting oslog stream");
   }
-  return file->close() && ended;
+  return ended && *outcome == Outcome::complete;
 }

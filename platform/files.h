@@ -11,7 +11,8 @@
 /// when the file is opened.
 void createEmptyFile(const std::string& path);
 
-/// A file that is open for writing; closed at the end of its life. One thread at a time.
+/// A file that is open for writing; closed at the end of its life, if not before. One thread at a
+/// time.
 class WritableFile {
  public:
   /// Opens what is at `path`; null when it cannot be written to. Never waits for a pipe's reader.
@@ -27,4 +28,8 @@ class WritableFile {
   /// or terminal did not take them within ten seconds. Must be called where SIGPIPE is ignored or
   /// blocked.
   [[nodiscard]] virtual std::error_code append(std::string_view bytes) = 0;
+
+  /// Closes the file, which is not used any more. Gives the error of close(2): there are file
+  /// systems that have none before.
+  [[nodiscard]] virtual std::error_code close() = 0;
 };

@@ -45,7 +45,7 @@ class LogStore {
 /// Delivers the entries of the device's log to a handler, on a thread of its own.
 ///
 /// One thread makes, sets up, activates and destroys it; any may call `invalidate`. The handlers
-/// run on the reader's thread, one call at a time, and are released with it.
+/// run on the reader's thread, one call at a time, and are released there when it ends.
 class LogReader {
  public:
   using EntryHandler = std::function<void(const LogEntry& entry)>;
@@ -56,7 +56,7 @@ class LogReader {
   explicit LogReader(std::shared_ptr<const LogSource> source);
   LogReader(const LogReader&) = delete;
   LogReader& operator=(const LogReader&) = delete;
-  /// Invalidates the reader. Does not wait for a handler that is running after `invalidate`.
+  /// Invalidates the reader, and does not wait for its thread.
   ~LogReader();
 
   /// The `kLogReader...` flags, or'd.

@@ -54,9 +54,6 @@ class LogReader::Session {
   void start(const std::shared_ptr<Session>& self, LogTime from);
   void stop();
 
-  /// Stops the delivering thread, and waits for it if its last handler has been called.
-  void release();
-
   unsigned flags = 0;
   std::optional<LogFilter> filter;
   EntryHandler entryHandler;
@@ -67,19 +64,16 @@ class LogReader::Session {
   unsigned long deliverAll(LogTime from);
   void deliverQueued();
   void deliver(const JournalValues& values, std::uint64_t realtime);
-  void end(unsigned long reason);
 
   LogTime position;  ///< The delivering thread's once that is started.
   EntryDecoder decoder;
   BatchQueue queue;
   std::atomic<bool> stopped = false;
-  std::atomic<bool> ended = false;
-  std::thread delivering;
 };
 
 void LogReader::Session::start(const std::shared_ptr<Session>& self, LogTime from) {
   position = from;
-  delivering = startThread("log.deliver", [self, from] { self->run(from); });
+  startThread("log.deliver", [self, from] { self->run(from); }).detach();
 }
 
 void LogReader::Session::stop() {
@@ -87,27 +81,13 @@ void LogReader::Session::stop() {
   queue.close();
 }
 
-void LogReader::Session::release() {
-  stop();
-  if (delivering.joinable() && ended) {
-    delivering.join();
-  } else if (delivering.joinable()) {
-    delivering.detach();
-  }
-}
-
 void LogReader::Session::run(LogTime from) {
   const auto reason = flags == kSupportedFlags ? deliverAll(from) : kLogReaderUnsupported;
-  if (!stopped) {
-    end(reason);
-  }
-}
-
-void LogReader::Session::end(unsigned long reason) {
-  ended = true;
-  if (invalidationHandler) {
+  if (!stopped && invalidationHandler) {
     invalidationHandler(reason, position);
   }
+  entryHandler = nullptr;
+  invalidationHandler = nullptr;
 }
 
 /// Reads and delivers everything, or until the reader is stopped. Returns the reason of the end.
@@ -144,7 +124,7 @@ LogReader::LogReader(std::shared_ptr<const LogSource> /*source*/)
     : session(std::make_shared<Session>()) {}
 
 LogReader::~LogReader() {
-  session->release();
+  session->stop();
 }
 
 void LogReader::setFlags(unsigned flags) {

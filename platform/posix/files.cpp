@@ -6,9 +6,11 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <chrono>
+#include <system_error>
 #include <utility>
 
 namespace {
@@ -38,6 +40,11 @@ class AppendedFile : public WritableFile {
 
   std::error_code append(std::string_view bytes) override {
     return writeWhole(file.get(), bytes, kPatience);
+  }
+
+  std::error_code close() override {
+    const int error = ::close(file.release()) == 0 ? 0 : errno;
+    return {error, std::generic_category()};
   }
 
  private:

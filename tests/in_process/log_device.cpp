@@ -23,6 +23,8 @@ struct DeviceFile : WritableFile {
     return {};
   }
 
+  std::error_code close() override { return std::make_error_code(logDevice.closeError); }
+
   std::string path;
 };
 

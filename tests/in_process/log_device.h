@@ -7,6 +7,7 @@
 #include <map>
 #include <optional>
 #include <string>
+#include <system_error>
 #include <vector>
 
 class LogSource {};
@@ -29,6 +30,7 @@ struct LogDevice {
 
   std::map<std::string, std::string> files;  ///< Content by path.
   std::size_t appendsUntilFull = 1000;       ///< After these, the disk is full.
+  std::errc closeError{};                    ///< What a file is closed with.
 
   bool groupsCanBeMade = true;
   std::chrono::nanoseconds longestWait{};  ///< The limit of the last wait that had one.

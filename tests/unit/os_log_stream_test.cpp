@@ -1,13 +1,10 @@
 #include "logdump/os_log_stream.h"
 
-#include "logdump/export_file.h"
 #include "tests/in_process/log_device.h"
 
 #include <gtest/gtest.h>
 
-#include <future>
 #include <string>
-#include <thread>
 #include <tuple>
 #include <vector>
 
@@ -42,7 +39,8 @@ bool exportTwoMessages(void (*prepare)(LogDevice&)) {
 }  // namespace
 
 TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
-  const std::string full = "Failed to write file: " + kPath + ": No space left on device";
+  const std::string failed = "Failed to write file: " + kPath + ": ",
+                    full = "No space left on device";
   // What is amiss, the result, what the system log is told, and what is in the file.
   const std::tuple<void (*)(LogDevice&), bool, std::vector<std::string>, std::string> cases[] = {
       // clang-format off
@@ -53,7 +51,9 @@ TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
       {[](LogDevice& d) { d.endReason.reset(); },
        false, {kStarted, "Timeout on getting oslog stream"}, kLine + kLine},
       {[](LogDevice& d) { d.appendsUntilFull = 1, d.endReason.reset(); },
-       false, {kStarted, full}, kLine},
+       false, {kStarted, failed + full}, kLine},
+      {[](LogDevice& d) { d.closeError = std::errc::io_error; },
+       false, {kStarted, failed + "Input/output error"}, kLine + kLine},
       // clang-format on
   };
   for (const auto& [prepare, result, messages, content] : cases) {
@@ -73,29 +73,4 @@ TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
   EXPECT_EQ(logDevice.filter, std::nullopt);
   EXPECT_EQ(logDevice.from, logDevice.now - std::chrono::hours(1));
   EXPECT_EQ(logDevice.longestWait, std::chrono::seconds(180));
-}
-
-TEST(ExportFile, StaysOpenUnderAWriteThatHangsAndTakesNoOther) {
-  static std::promise<void> begun;
-  static std::promise<void> released;
-  static int closed = 0;
-  struct HangingFile : WritableFile {
-    const std::shared_ptr<void> closing{nullptr, [](void*) { ++closed; }};
-    std::error_code append(std::string_view /*bytes*/) override {
-      begun.set_value();  // Throws the second time.
-      released.get_future().wait();
-      return {};
-    }
-  };
-  {
-    ExportFile file("hangs", std::make_unique<HangingFile>());
-    std::thread writing([&] { EXPECT_TRUE(file.append("one")); });
-    begun.get_future().wait();
-    EXPECT_FALSE(file.close());
-    EXPECT_EQ(closed, 0);
-    released.set_value();
-    writing.join();
-    EXPECT_TRUE(file.append("two"));
-  }
-  EXPECT_EQ(closed, 1);
 }
