@@ -24,9 +24,9 @@ bool isInternalBuild();
 /// Whether the operating system is a carrier build.
 bool isCarrierBuild();
 
-/// Whether a process runs whose command name, or the last component of whose executable, is exactly
-/// `name`. The process table is read at each call; see proc(5).
-bool processRunning(const std::string& name);
-
-/// The names for which `processRunning` is true, without the beginnings of longer names.
+/// The command names of the processes that run now, and the last components of their executables,
+/// see proc(5). Without command names of 15 bytes: those of longer ones are cut so.
 std::set<std::string> processNames();
+
+/// Whether a process ran with exactly this name when this was first asked for any name.
+bool processRunning(const std::string& name);
