@@ -1,13 +1,12 @@
 #include "platform/line_reader.h"
+#include "platform/posix/plain_line.h"
 #include "platform/process_end.h"
-#include "platform/terminal/plain_line.h"
 #include "platform/unicode/utf8.h"
 
 #include <poll.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <clocale>
 #include <csignal>
 #include <cstdio>
@@ -19,7 +18,6 @@
 #include <sstream>
 #include <string_view>
 #include <utility>
-#include <vector>
 
 // These use what <cstdio> declares.
 #include <readline/history.h>
@@ -42,8 +40,7 @@ namespace {
 
 // readline keeps its state in variables, and calls back on the thread that reads.
 const Completer* completer = nullptr;
-Completions completions;                     ///< Of the word at the cursor.
-volatile std::sig_atomic_t interrupted = 0;  ///< By Ctrl-C, since the prompt was written.
+volatile std::sig_atomic_t caught = 0;  ///< SIGINT or SIGCONT, where one is not dealt with yet.
 
 /// Takes what readline writes, see fopencookie(3). std::cout waits where a terminal has no room.
 ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
@@ -51,26 +48,25 @@ ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   return static_cast<ssize_t>(count);
 }
 
-/// Has `completions` be what the line up to the cursor can become. Tells readline what is in front
-/// of the word: white space, and in a path a slash.
-char* lookUpCompletions() {
-  static char breaks[] = "/ \t\n\v\f\r";
-  completions = (*completer)({rl_line_buffer, static_cast<std::size_t>(rl_point)});
-  const auto start = static_cast<std::size_t>(rl_point) - completions.typed;
-  return breaks + (start > 0 && rl_line_buffer[start - 1] == '/' ? 0 : 1);
+/// What the line up to the cursor can become.
+Completions lookUpCompletions() {
+  return (*completer)({rl_line_buffer, static_cast<std::size_t>(rl_point)});
 }
 
-/// Gives readline the words one by one, the first when it is asked for the first time.
+/// Gives readline the words one by one, looked up when it asks for the first.
 char* nextWord(const char* /*typed*/, int isLater) {
-  static std::size_t index;
-  index = isLater == 0 ? 0 : index + 1;
-  if (index >= completions.words.size()) {
+  static Completions completions;
+  if (isLater == 0) {
+    completions = lookUpCompletions();
+  }
+  if (completions.words.empty()) {
     return nullptr;
   }
-  const auto& word = completions.words[index];
+  auto& word = completions.words.back();
   rl_completion_append_character = static_cast<unsigned char>(word.back());
   auto* const copy = static_cast<char*>(xmalloc(word.size()));
   copy[word.copy(copy, word.size() - 1)] = '\0';
+  completions.words.pop_back();
   return copy;
 }
 
@@ -79,20 +75,9 @@ char* nextWord(const char* /*typed*/, int isLater) {
 bool isPastedTab() {
   int waiting = 0;
   ioctl(STDIN_FILENO, FIONREAD, &waiting);
-  lookUpCompletions();
-  const auto& [typed, words] = completions;
+  const auto [typed, words] = lookUpCompletions();
   return waiting > 0 &&
          (typed > 0 ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
-}
-
-/// Has what was done to the line so far not be undone once a command has gone through the history:
-/// readline 8.2 may free these steps in two places. They are kept, as one of them may own them.
-void forgetSteps() {
-  static int place = 0;
-  static std::vector<UNDO_LIST*> steps;
-  if (std::exchange(place, where_history()) != where_history() && rl_undo_list != nullptr) {
-    steps.push_back(std::exchange(rl_undo_list, nullptr));
-  }
 }
 
 /// Draws the line. On a screen of one row readline 8.2 divides by a third of its columns, so that
@@ -110,16 +95,16 @@ void draw() {
 int readByte() {
   pollfd terminal{STDIN_FILENO, POLLIN, 0};
   do {
-    const int pending = rl_pending_signal();
-    if (pending == SIGWINCH) {
+    if (rl_pending_signal() == SIGWINCH) {
       rl_clear_visible_line();  // readline would do that if it did not call `draw`.
     }
     rl_check_signals();
-    if (pending == SIGTSTP) {
+    if (caught == SIGCONT) {
+      caught = 0;
       rl_forced_update_display();
     }
-  } while (interrupted == 0 && poll(&terminal, 1, -1) < 0);
-  if (interrupted != 0) {
+  } while (caught != SIGINT && poll(&terminal, 1, -1) < 0);
+  if (caught == SIGINT) {
     return RL_ISSTATE(RL_STATE_READCMD) ? READERR : EOF;
   }
   const int byte = rl_getc(stdin);
@@ -132,8 +117,11 @@ int readUtf8(FILE* /*stream*/) {
   static std::string typed;
   static std::string text;
   static bool isEnded = false;
-  if (RL_ISSTATE(RL_STATE_READCMD)) {
-    forgetSteps();
+  static int place = 0;
+  if (RL_ISSTATE(RL_STATE_READCMD) && std::exchange(place, where_history()) != where_history()) {
+    // Once a command has gone through the history, readline 8.2 may free the steps of a line, which
+    // can be undone, in two places. They are lost: one of the two may own them.
+    rl_undo_list = nullptr;
   }
   while (text.empty()) {
     const int byte = readByte();
@@ -163,7 +151,7 @@ bool prepareEditing() {
   rl_outstream = fopencookie(nullptr, "w", {nullptr, writeToScreen, nullptr, nullptr});
   rl_getc_function = readUtf8;
   rl_change_environment = 0;
-  rl_completion_word_break_hook = lookUpCompletions;
+  rl_basic_word_break_characters = "/ \t\n\v\f\r";
   rl_completion_entry_function = nextWord;
   // Sequences of keys that mean nothing. What is bound later goes first.
   for (const auto* begin : {"\\e[", "\\e[[", "\\eO", "\\e\\e[", "\\e\\eO"}) {
@@ -176,33 +164,27 @@ bool prepareEditing() {
   rl_initialize();
   rl_redisplay_function = draw;  // Not before: readline would take the terminal for a dumb one.
   stifle_history(1000);
+  std::signal(SIGCONT, [](int) { caught = SIGCONT; });
   return std::at_quick_exit(rl_deprep_terminal) == 0;
 }
 
 /// Lets readline edit a line; Ctrl-C gives up the line, and begins another.
 std::unique_ptr<char, void (*)(void*)> editLine(const std::string& prompt) {
   std::unique_ptr<char, void (*)(void*)> line(nullptr, std::free);
-  auto* const found = std::signal(SIGINT, [](int) { interrupted = 1; });
+  auto* const found = std::signal(SIGINT, [](int) { caught = SIGINT; });
   if (found == SIG_IGN) {
     std::signal(SIGINT, SIG_IGN);
   }
   do {
-    interrupted = 0;
+    caught = 0;
     rl_eof_found = 0;
     line.reset(readline(prompt.c_str()));
     if (!line && rl_variable_value("enable-bracketed-paste") != std::string_view("on")) {
       std::cout << std::endl;  // As readline itself does where it has turned that off.
     }
-  } while (interrupted != 0);
+  } while (caught == SIGINT);
   std::signal(SIGINT, found);
   return line;
-}
-
-/// Adds a line to the history, unless it was the last one, too.
-void remember(const std::string& line) {
-  if (!line.empty() && (history_length == 0 || history_list()[history_length - 1]->line != line)) {
-    add_history(line.c_str());
-  }
 }
 
 }  // namespace
@@ -222,8 +204,12 @@ std::optional<std::string> readLine(const std::string& prompt, const Completer& 
     if (!entered) {
       return std::nullopt;
     }
-    remember(entered.get());
-    pasted = std::istringstream(entered.get());
+    line = entered.get();
+    if (!line.empty() &&
+        (history_length == 0 || line != history_list()[history_length - 1]->line)) {
+      add_history(line.c_str());
+    }
+    pasted = std::istringstream(line);
     std::getline(pasted, line);
   }
   return std::cout ? std::optional(line) : std::nullopt;
