@@ -12,21 +12,16 @@ namespace {
 const char* const kReasonPrefix = "[velltool] ";
 const char* const kDefaultReason = "User triggered";
 
-struct Keyword {
-  const char* word = nullptr;
-  std::optional<CompressionMode> mode;  ///< Without one: the user is not asked.
-};
+/// The words that are no reason, with the mode that they ask for.
+const std::pair<const char*, std::optional<CompressionMode>> kKeywords[] = {
+    {"nocompress", kCompressionNone},
+    {"tar.gz", kCompressionTarGz},
+    {"tar", kCompressionTar},
+    {"nonui", std::nullopt}};
 
-const Keyword kKeywords[] = {{"nocompress", kCompressionNone},
-                             {"tar.gz", kCompressionTarGz},
-                             {"tar", kCompressionTar},
-                             {"nonui", std::nullopt}};
-
-/// The keyword that `word` is; null for a reason.
-const Keyword* findKeyword(const std::string& word) {
-  const auto* const found = std::ranges::find_if(
-      kKeywords, [&](const Keyword& keyword) { return equalNoCase(word, keyword.word); });
-  return found == std::end(kKeywords) ? nullptr : found;
+auto findKeyword(const std::string& word) {
+  return std::ranges::find_if(
+      kKeywords, [&](const auto& keyword) { return equalNoCase(word, keyword.first); });
 }
 
 }  // namespace
@@ -38,19 +33,19 @@ void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::
     const auto word = std::move(args.front());
     args.pop_front();
     const auto* const keyword = findKeyword(word);
-    if (keyword == nullptr) {
+    if (keyword == std::end(kKeywords)) {
       reason = kReasonPrefix + word;
       return;
     }
-    mode = keyword->mode.value_or(mode);
-    nonui = nonui || !keyword->mode;
+    mode = keyword->second.value_or(mode);
+    nonui = nonui || !keyword->second;
   }
 }
 
 WordCompleter completeLogdumpArgs(bool nonui) {
   return [nonui](const std::list<std::string>& before, const std::string& /*typed*/) {
     std::set<std::string> words{"--"};
-    const bool hasReason = !std::ranges::all_of(before, findKeyword);
+    const bool hasReason = std::ranges::count(before, std::end(kKeywords), findKeyword) > 0;
     for (const auto& [word, mode] : kKeywords) {
       if (!hasReason && (nonui || mode)) {
         words.insert(word);

@@ -81,11 +81,9 @@ std::set<std::string> filesAt(const std::string& typed) {
   std::error_code error;
   for (fs::directory_iterator entry(folder.empty() ? "." : folder, error), end;
        !error && entry != end; entry.increment(error)) {
-    const auto name = entry->path().filename().string();
     std::error_code unknown;
-    if (!name.starts_with('.') || typed.size() > folder.size()) {
-      files.insert(folder + name + (entry->is_directory(unknown) ? "/" : ""));
-    }
+    files.insert(folder + entry->path().filename().string() +
+                 (entry->is_directory(unknown) ? "/" : ""));
   }
   return files;
 }
