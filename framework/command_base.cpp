@@ -74,11 +74,9 @@ std::set<std::string> CommandBase::getWords() const {
   return words;
 }
 
-std::set<std::string> CommandBase::completeWord(const std::string& word,
-                                                const std::list<std::string>& before,
-                                                const std::string& typed) const {
+WordCompleter CommandBase::getWordCompleter(std::string word) const {
   const auto found = completers.find(word);
-  return found == completers.end() ? std::set<std::string>() : found->second(before, typed);
+  return found == completers.end() ? nullptr : found->second;
 }
 
 std::string CommandBase::getHierarchy() const {

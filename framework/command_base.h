@@ -72,9 +72,8 @@ class CommandBase : public std::enable_shared_from_this<CommandBase> {
   /// The words of all handlers and children.
   std::set<std::string> getWords() const;
 
-  /// What the completer registered under `word` gives; nothing without one.
-  std::set<std::string> completeWord(const std::string& word, const std::list<std::string>& before,
-                                     const std::string& typed) const;
+  /// The completer registered under `word`; empty when there is none.
+  WordCompleter getWordCompleter(std::string word) const;
 
   /// The names from the root to this node, each after a "/"; empty before `init`.
   std::string getHierarchy() const;

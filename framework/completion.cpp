@@ -54,7 +54,8 @@ Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const s
     } else if (*word == "cd") {
       next = Next::path;
     } else if (node->isValidCommand(*word)) {
-      known = node->completeWord(*word, {std::next(word), words.end()}, typed);
+      const auto complete = node->getWordCompleter(*word);
+      known = complete ? complete({std::next(word), words.end()}, typed) : known;
       node = nullptr;
     } else {
       node = node->getSubCommandObj(*word);

@@ -7,6 +7,7 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <clocale>
 #include <csignal>
 #include <cstdio>
@@ -26,9 +27,7 @@
 // readline asks these two for memory. Its own would end the process in another way.
 extern "C" void* xrealloc(void* memory, std::size_t size) {
   auto* const found = std::realloc(memory, size);
-  if (found == nullptr) {
-    endProcess("out of memory");
-  }
+  endIfScarce(found == nullptr ? ENOMEM : 0);
   return found;
 }
 
@@ -48,16 +47,11 @@ ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
   return static_cast<ssize_t>(count);
 }
 
-/// What the line up to the cursor can become.
-Completions lookUpCompletions() {
-  return (*completer)({rl_line_buffer, static_cast<std::size_t>(rl_point)});
-}
-
 /// Gives readline the words one by one, looked up when it asks for the first.
 char* nextWord(const char* /*typed*/, int isLater) {
   static Completions completions;
   if (isLater == 0) {
-    completions = lookUpCompletions();
+    completions = (*completer)({rl_line_buffer, rl_line_buffer + rl_point});
   }
   if (completions.words.empty()) {
     return nullptr;
@@ -75,7 +69,7 @@ char* nextWord(const char* /*typed*/, int isLater) {
 bool isPastedTab() {
   int waiting = 0;
   ioctl(STDIN_FILENO, FIONREAD, &waiting);
-  const auto [typed, words] = lookUpCompletions();
+  const auto [typed, words] = (*completer)({rl_line_buffer, rl_line_buffer + rl_point});
   return waiting > 0 &&
          (typed > 0 ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
 }
@@ -114,8 +108,7 @@ int readByte() {
 /// Gives readline byte by byte what is typed, and U+FFFD for what is no UTF-8: readline loses the
 /// byte by which it finds that out.
 int readUtf8(FILE* /*stream*/) {
-  static std::string typed;
-  static std::string text;
+  static std::string typed, text;
   static bool isEnded = false;
   static int place = 0;
   if (RL_ISSTATE(RL_STATE_READCMD) && std::exchange(place, where_history()) != where_history()) {
@@ -169,12 +162,11 @@ bool prepareEditing() {
 }
 
 /// Lets readline edit a line; Ctrl-C gives up the line, and begins another.
-std::unique_ptr<char, void (*)(void*)> editLine(const std::string& prompt) {
+std::optional<std::string> editLine(const std::string& prompt) {
   std::unique_ptr<char, void (*)(void*)> line(nullptr, std::free);
-  auto* const found = std::signal(SIGINT, [](int) { caught = SIGINT; });
-  if (found == SIG_IGN) {
-    std::signal(SIGINT, SIG_IGN);
-  }
+  auto* const found = std::signal(SIGINT, SIG_IGN);
+  const auto drop = [](int) { caught = SIGINT; };
+  std::signal(SIGINT, found == SIG_IGN ? SIG_IGN : drop);
   do {
     caught = 0;
     rl_eof_found = 0;
@@ -184,7 +176,7 @@ std::unique_ptr<char, void (*)(void*)> editLine(const std::string& prompt) {
     }
   } while (caught == SIGINT);
   std::signal(SIGINT, found);
-  return line;
+  return line ? std::optional<std::string>(line.get()) : std::nullopt;
 }
 
 }  // namespace
@@ -204,12 +196,11 @@ std::optional<std::string> readLine(const std::string& prompt, const Completer& 
     if (!entered) {
       return std::nullopt;
     }
-    line = entered.get();
-    if (!line.empty() &&
-        (history_length == 0 || line != history_list()[history_length - 1]->line)) {
-      add_history(line.c_str());
+    if (!entered->empty() &&
+        (history_length == 0 || *entered != history_list()[history_length - 1]->line)) {
+      add_history(entered->c_str());
     }
-    pasted = std::istringstream(line);
+    pasted = std::istringstream(*entered);
     std::getline(pasted, line);
   }
   return std::cout ? std::optional(line) : std::nullopt;
