@@ -70,8 +70,8 @@ Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const s
   }
   for (const auto& word : node ? wordsAt(*node, next, typed) : known) {
     if (word.starts_with(typed) && canBeTyped(word)) {
-      const auto* const end = next == Next::path ? "/" : word.ends_with('/') ? "" : " ";
-      completions.words.push_back(word.substr(typed.size() - completions.typed) + end);
+      completions.words.push_back(word.substr(typed.size() - completions.typed) +
+                                  (next == Next::path ? "/" : ""));
     }
   }
   return completions;

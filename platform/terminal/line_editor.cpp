@@ -56,21 +56,20 @@ char* nextWord(const char* /*typed*/, int isLater) {
   if (completions.words.empty()) {
     return nullptr;
   }
-  auto& word = completions.words.back();
-  rl_completion_append_character = static_cast<unsigned char>(word.back());
-  auto* const copy = static_cast<char*>(xmalloc(word.size()));
-  copy[word.copy(copy, word.size() - 1)] = '\0';
+  const auto word = std::move(completions.words.back());
   completions.words.pop_back();
-  return copy;
+  rl_completion_append_character = word.ends_with('/') ? '\0' : ' ';
+  return static_cast<char*>(std::memcpy(xmalloc(word.size() + 1), word.c_str(), word.size() + 1));
 }
 
 /// Whether Tab parts words: with more to come, behind a word that it does not complete, or where it
-/// would begin one. A terminal that does not mark what is pasted gives it so.
+/// would begin one. Terminals that do not mark what is pasted give it so.
 bool isPastedTab() {
+  const std::string_view terminal = rl_terminal_name;
   int waiting = 0;
   ioctl(STDIN_FILENO, FIONREAD, &waiting);
   const auto [typed, words] = (*completer)({rl_line_buffer, rl_line_buffer + rl_point});
-  return waiting > 0 &&
+  return waiting > 0 && (terminal == "linux" || terminal.starts_with("vt")) &&
          (typed > 0 ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
 }
 
@@ -154,9 +153,10 @@ bool prepareEditing() {
   rl_variable_bind("input-meta", "on");
   rl_variable_bind("output-meta", "on");
   rl_variable_bind("convert-meta", "off");
+  stifle_history(1000);
+  rl_unbind_function_in_map(rl_vi_editing_mode, emacs_meta_keymap);
   rl_initialize();
   rl_redisplay_function = draw;  // Not before: readline would take the terminal for a dumb one.
-  stifle_history(1000);
   std::signal(SIGCONT, [](int) { caught = SIGCONT; });
   return std::at_quick_exit(rl_deprep_terminal) == 0;
 }

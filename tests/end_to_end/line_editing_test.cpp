@@ -143,8 +143,12 @@ TEST(LineEditing, AsksForWhatIsPastedAsFromAPipe) {
   screen.type("o Enter");
   EXPECT_EQ(reasonAskedOf(manager), "one");
   EXPECT_EQ(reasonAskedOf(manager), "two");
+  screen.paste("logdump tel n\\tx\\n", "-r");  // As if typed during a command.
+  EXPECT_EQ(reasonAskedOf(manager), "nox");
   screen.type("C-l");
   screen.expect(kPrompt);
+  screen.type("C-d");
+  screen.startTool("TERM=vt220 velltool");
   screen.paste("\\tlogdump\\ttel\\ttar\\tthree\\tx\\n", "-r");
   EXPECT_EQ(reasonAskedOf(manager), "three");
 }
