@@ -154,7 +154,7 @@ bool prepareEditing() {
   rl_variable_bind("output-meta", "on");
   rl_variable_bind("convert-meta", "off");
   stifle_history(1000);
-  rl_unbind_function_in_map(rl_vi_editing_mode, emacs_meta_keymap);
+  rl_unbind_function_in_map(rl_vi_editing_mode, rl_get_keymap_by_name("emacs-meta"));
   rl_initialize();
   rl_redisplay_function = draw;  // Not before: readline would take the terminal for a dumb one.
   std::signal(SIGCONT, [](int) { caught = SIGCONT; });
