@@ -25,5 +25,5 @@ using Completer = std::function<Completions(const std::string& text)>;
 /// that were entered at once come one by one. During the call the terminal is set for editing; it
 /// is as it was found after std::quick_exit, and when a signal that people send (readline catches
 /// INT, TERM, HUP, QUIT, ALRM and those of job control) stops or ends the process. Other threads
-/// have to block signals. All calls are from the same thread.
+/// have to block signals. SIGCONT stays caught between calls. All calls are from the same thread.
 std::optional<std::string> readLine(const std::string& prompt, const Completer& complete);

@@ -17,6 +17,9 @@ std::set<std::string> processNames() {
   std::error_code error;
   for (fs::directory_iterator entry(sysroot() / "proc", error), end; !error && entry != end;
        entry.increment(error)) {
+    if (entry->path().filename().string().find_first_not_of("0123456789") != std::string::npos) {
+      continue;
+    }
     // A process may end while it is looked at: what can no longer be read then is empty.
     std::string command;
     readRegularFile(entry->path() / "comm", kCutLength + 1, command);

@@ -86,6 +86,7 @@ void LogReader::Session::run(LogTime from) {
   if (!stopped && invalidationHandler) {
     invalidationHandler(reason, position);
   }
+  // What the handlers hold, as a file, may take its time to go: here, nobody waits for it.
   entryHandler = nullptr;
   invalidationHandler = nullptr;
 }

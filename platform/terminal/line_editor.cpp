@@ -7,6 +7,7 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <clocale>
 #include <csignal>
@@ -39,7 +40,8 @@ namespace {
 
 // readline keeps its state in variables, and calls back on the thread that reads.
 const Completer* completer = nullptr;
-volatile std::sig_atomic_t caught = 0;  ///< SIGINT or SIGCONT, where one is not dealt with yet.
+std::atomic<bool> interrupted = false;  ///< By Ctrl-C, since the prompt was written.
+std::atomic<bool> resumed = false;      ///< After a stop; the line is not on the screen yet.
 
 /// Takes what readline writes, see fopencookie(3). std::cout waits where a terminal has no room.
 ssize_t writeToScreen(void* /*cookie*/, const char* bytes, std::size_t count) {
@@ -68,9 +70,10 @@ bool isPastedTab() {
   const std::string_view terminal = rl_terminal_name;
   int waiting = 0;
   ioctl(STDIN_FILENO, FIONREAD, &waiting);
-  const auto [typed, words] = (*completer)({rl_line_buffer, rl_line_buffer + rl_point});
+  const bool begun = rl_point > 0 && static_cast<unsigned char>(rl_line_buffer[rl_point - 1]) > ' ';
+  const auto words = (*completer)({rl_line_buffer, rl_line_buffer + rl_point}).words;
   return waiting > 0 && (terminal == "linux" || terminal.starts_with("vt")) &&
-         (typed > 0 ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
+         (begun ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
 }
 
 /// Draws the line. On a screen of one row readline 8.2 divides by a third of its columns, so that
@@ -78,9 +81,7 @@ bool isPastedTab() {
 void draw() {
   int columns = 0;
   rl_get_screen_size(nullptr, &columns);
-  if (columns < 4) {
-    rl_set_screen_size(0, 4);
-  }
+  rl_set_screen_size(0, columns < 4 ? 4 : 0);  // 0 changes nothing.
   rl_redisplay();
 }
 
@@ -92,12 +93,12 @@ int readByte() {
       rl_clear_visible_line();  // readline would do that if it did not call `draw`.
     }
     rl_check_signals();
-    if (caught == SIGCONT) {
-      caught = 0;
+    if (resumed.exchange(false)) {
+      std::fputc('\r', rl_outstream);  // The row may hold the line still.
       rl_forced_update_display();
     }
-  } while (caught != SIGINT && poll(&terminal, 1, -1) < 0);
-  if (caught == SIGINT) {
+  } while (!interrupted && poll(&terminal, 1, -1) < 0);
+  if (interrupted) {
     return RL_ISSTATE(RL_STATE_READCMD) ? READERR : EOF;
   }
   const int byte = rl_getc(stdin);
@@ -157,7 +158,7 @@ bool prepareEditing() {
   rl_unbind_function_in_map(rl_vi_editing_mode, rl_get_keymap_by_name("emacs-meta"));
   rl_initialize();
   rl_redisplay_function = draw;  // Not before: readline would take the terminal for a dumb one.
-  std::signal(SIGCONT, [](int) { caught = SIGCONT; });
+  std::signal(SIGCONT, [](int) { resumed = true; });
   return std::at_quick_exit(rl_deprep_terminal) == 0;
 }
 
@@ -165,16 +166,16 @@ bool prepareEditing() {
 std::optional<std::string> editLine(const std::string& prompt) {
   std::unique_ptr<char, void (*)(void*)> line(nullptr, std::free);
   auto* const found = std::signal(SIGINT, SIG_IGN);
-  const auto drop = [](int) { caught = SIGINT; };
+  const auto drop = [](int) { interrupted = true; };
   std::signal(SIGINT, found == SIG_IGN ? SIG_IGN : drop);
   do {
-    caught = 0;
+    interrupted = false;
     rl_eof_found = 0;
     line.reset(readline(prompt.c_str()));
     if (!line && rl_variable_value("enable-bracketed-paste") != std::string_view("on")) {
       std::cout << std::endl;  // As readline itself does where it has turned that off.
     }
-  } while (caught == SIGINT);
+  } while (interrupted);
   std::signal(SIGINT, found);
   return line ? std::optional<std::string>(line.get()) : std::nullopt;
 }

@@ -149,8 +149,8 @@ TEST(LineEditing, AsksForWhatIsPastedAsFromAPipe) {
   screen.expect(kPrompt);
   screen.type("C-d");
   screen.startTool("TERM=vt220 velltool");
-  screen.paste("\\tlogdump\\ttel\\ttar\\tthree\\tx\\n", "-r");
-  EXPECT_EQ(reasonAskedOf(manager), "three");
+  screen.paste("\\tlogdump\\ttel\\ttar\\tthree/\\tx\\n", "-r");
+  EXPECT_EQ(reasonAskedOf(manager), "three/");
 }
 
 TEST(LineEditing, ShowsWhatIsTyped) {
@@ -164,7 +164,7 @@ TEST(LineEditing, ShowsWhatIsTyped) {
       {"xe\u0301か\u3099漢y Home Right Right Right '|'", "xe\u0301か\u3099|漢y"},
       {"lo Tab te Tab '|'", "logdump tel |"},
       {"'lo foo' Left Left Left Left Tab '|'", "logdump| foo"},
-      {"'tel -- cd lo' Tab '|'", "tel -- cd logdump/|"},
+      {"'tel -- cd logdump/../lo' Tab '|'", "tel -- cd logdump/../logdump/|"},
       {"'logdump ' Tab Tab '|'",
        "logdump\nbb     cd     core   help   oslog  tel\n" + kPrompt + "logdump |"},
   };
