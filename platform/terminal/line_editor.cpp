@@ -60,7 +60,7 @@ char* nextWord(const char* /*typed*/, int isLater) {
   }
   const auto word = std::move(completions.words.back());
   completions.words.pop_back();
-  rl_completion_append_character = word.ends_with('/') ? '\0' : ' ';
+  rl_completion_append_character = word.ends_with('/') ? 0 : ' ';
   return static_cast<char*>(std::memcpy(xmalloc(word.size() + 1), word.c_str(), word.size() + 1));
 }
 
