@@ -45,7 +45,7 @@ class LogStore {
 /// Delivers the entries of the device's log to a handler, on a thread of its own.
 ///
 /// One thread makes, sets up, activates and destroys it; any may call `invalidate`. The handlers
-/// run on the reader's thread, one call at a time, and once activated, are released there at its end.
+/// run on the reader's thread, one call at a time; a reader that was activated releases them there.
 class LogReader {
  public:
   using EntryHandler = std::function<void(const LogEntry& entry)>;
