@@ -3,7 +3,10 @@
 #include "platform/process_end.h"
 #include "platform/telephony.h"
 
+#include <unistd.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <climits>
 #include <filesystem>
 #include <string>
@@ -24,9 +27,11 @@ std::set<std::string> processNames() {
     std::string command;
     readRegularFile(entry->path() / "comm", kCutLength + 1, command);
     command.erase(std::min(command.find('\n'), command.size()));
-    std::error_code unknown;
-    const auto executable = fs::read_symlink(entry->path() / "exe", unknown).filename().string();
-    endIfScarce(unknown.value());
+    std::string executable(PATH_MAX, '\0');
+    const auto length = readlink((entry->path() / "exe").c_str(), executable.data(), PATH_MAX);
+    endIfScarce(length < 0 ? errno : 0);
+    executable.resize(static_cast<std::size_t>(std::max<ssize_t>(length, 0)));
+    executable.erase(0, executable.rfind('/') + 1);
     names.insert(command.size() < kCutLength ? command : "");
     names.insert(executable.size() <= NAME_MAX ? executable : "");
   }
