@@ -14,8 +14,13 @@ namespace {
 
 struct DeviceFile : WritableFile {
   explicit DeviceFile(std::string filePath) : path(std::move(filePath)) {}
+  ~DeviceFile() override { ++logDevice.filesClosed; }
 
   std::error_code append(std::string_view bytes) override {
+    if (logDevice.hang) {
+      logDevice.hang->begun.set_value();  // Throws the second time.
+      logDevice.hang->released.get_future().wait();
+    }
     if (logDevice.appendsUntilFull-- == 0) {
       return std::make_error_code(std::errc::no_space_on_device);
     }
@@ -38,11 +43,19 @@ std::unique_ptr<WritableFile> WritableFile::open(const std::string& path) {
 
 void LogReader::activate(LogTime from) {
   logDevice.from = from;
-  for (const auto& entry : logDevice.entries) {
-    logDevice.entryHandler(entry);
-  }
-  if (logDevice.endReason) {
-    logDevice.endHandler(*logDevice.endReason, from);
+  const auto deliver = [from] {
+    for (const auto& entry : logDevice.entries) {
+      logDevice.entryHandler(entry);
+    }
+    if (logDevice.endReason) {
+      logDevice.endHandler(*logDevice.endReason, from);
+    }
+  };
+  if (logDevice.hang) {
+    logDevice.delivering = std::thread(deliver);
+    logDevice.hang->begun.get_future().wait();
+  } else {
+    deliver();
   }
 }
 

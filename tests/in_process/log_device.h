@@ -3,11 +3,14 @@
 #include "platform/log_store.h"
 
 #include <chrono>
+#include <future>
 #include <list>
 #include <map>
+#include <memory>
 #include <optional>
 #include <string>
 #include <system_error>
+#include <thread>
 #include <vector>
 
 class LogSource {};
@@ -15,6 +18,11 @@ class LogSource {};
 /// The system log, the files, the clock and the work groups behind the in-process platform: the
 /// tests' own side of them.
 namespace in_process {
+
+/// A write that does not return before the test says so.
+struct Hang {
+  std::promise<void> begun, released;
+};
 
 /// What a test sets before it exports, and reads after it has.
 struct LogDevice {
@@ -31,6 +39,9 @@ struct LogDevice {
   std::map<std::string, std::string> files;  ///< Content by path.
   std::size_t appendsUntilFull = 1000;       ///< After these, the disk is full.
   std::errc closeError{};                    ///< What a file is closed with.
+  std::shared_ptr<Hang> hang;                ///< Of the first write, on a thread of its own.
+  std::thread delivering;                    ///< That thread.
+  int filesClosed = 0;
 
   bool groupsCanBeMade = true;
   std::chrono::nanoseconds longestWait{};  ///< The limit of the last wait that had one.

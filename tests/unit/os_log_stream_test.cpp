@@ -74,3 +74,16 @@ TEST(OsLogStream, WritesEachMessageUntilSomethingFailsAndSaysWhat) {
   EXPECT_EQ(logDevice.from, logDevice.now - std::chrono::hours(1));
   EXPECT_EQ(logDevice.longestWait, std::chrono::seconds(180));
 }
+
+TEST(OsLogStream, LeavesAWriteThatHangsAlone) {
+  EXPECT_FALSE(exportTwoMessages(
+      [](LogDevice& device) { device.hang = std::make_shared<in_process::Hang>(); }));
+  EXPECT_EQ(logDevice.messages.back(), "Timeout on getting oslog stream");
+  EXPECT_EQ(logDevice.filesClosed, 0);
+  logDevice.hang->released.set_value();
+  logDevice.delivering.join();
+  logDevice.entryHandler = nullptr;
+  logDevice.endHandler = nullptr;
+  EXPECT_EQ(logDevice.filesClosed, 1);
+  EXPECT_EQ(logDevice.files[kPath], kLine);
+}
