@@ -14,7 +14,6 @@ namespace {
 
 struct DeviceFile : WritableFile {
   explicit DeviceFile(std::string filePath) : path(std::move(filePath)) {}
-  ~DeviceFile() override { ++logDevice.filesClosed; }
 
   std::error_code append(std::string_view bytes) override {
     if (logDevice.hang) {
@@ -30,6 +29,7 @@ struct DeviceFile : WritableFile {
 
   std::error_code close() override { return std::make_error_code(logDevice.closeError); }
 
+  const std::shared_ptr<void> closing{nullptr, [](void*) { ++logDevice.filesClosed; }};
   std::string path;
 };
 
