@@ -208,14 +208,15 @@ bool JournalFileIterator::goToNext() {
 /// plainly to the first entry after the time `left`, from the start: seeking a time uses an index
 /// too.
 void JournalFileIterator::goOnWithoutIndex(std::uint64_t left) {
-  note("its index contradicts itself");
   index = JournalIndex();
   end = End();
   bool found = open() && (!file.isLive || fixEnd()) && goToFirst();
   while (found && current <= left) {
     found = state == State::Walking && goToNext();
   }
-  if (!found) {
+  if (found) {
+    note("its index contradicts itself");
+  } else {
     close(kEndsEarly);
   }
 }

@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 
 int readRegularFile(const std::filesystem::path& path, std::size_t most, std::string& text) {
@@ -20,14 +21,13 @@ int readRegularFile(const std::filesystem::path& path, std::size_t most, std::st
   if (!S_ISREG(status.st_mode)) {
     return EINVAL;
   }
-  text.resize(most);
-  std::size_t length = 0;
+  text.clear();
+  std::array<char, 4096> piece{};  // What the kernel names the size of need not be what can be read.
   ssize_t count = 1;
-  while ((count > 0 || (count < 0 && errno == EINTR)) && length < most) {
-    count = read(file.get(), text.data() + length, most - length);
-    length += static_cast<std::size_t>(std::max<ssize_t>(count, 0));
+  while ((count > 0 || (count < 0 && errno == EINTR)) && text.size() < most) {
+    count = read(file.get(), piece.data(), std::min(piece.size(), most - text.size()));
+    text.append(piece.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
   }
-  text.resize(length);
   if (count < 0) {
     endIfScarce(errno);
     return errno;

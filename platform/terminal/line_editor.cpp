@@ -165,9 +165,9 @@ bool prepareEditing() {
 /// Lets readline edit a line; Ctrl-C gives up the line, and begins another.
 std::optional<std::string> editLine(const std::string& prompt) {
   std::unique_ptr<char, void (*)(void*)> line(nullptr, std::free);
-  auto* const found = std::signal(SIGINT, SIG_IGN);
   const auto drop = [](int) { interrupted = true; };
-  std::signal(SIGINT, found == SIG_IGN ? SIG_IGN : drop);
+  auto* const found = std::signal(SIGINT, drop);
+  std::signal(SIGINT, found == SIG_IGN ? found : drop);
   do {
     interrupted = false;
     rl_eof_found = 0;
