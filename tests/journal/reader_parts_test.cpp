@@ -4,7 +4,6 @@
 #include "platform/journal/duplicate_filter.h"
 #include "platform/journal/journal_place.h"
 #include "platform/journal/machine_time_zone.h"
-#include "platform/journal/step_strategy.h"
 #include "platform/journal/turns.h"
 
 #include <gtest/gtest.h>
@@ -110,24 +109,6 @@ TEST(MachineTimeZone, IsWhatTheLibrarySaysAtAnyTime) {
       const auto offset = timeZone.offsetAt(std::chrono::sys_seconds(std::chrono::seconds(time)));
       ASSERT_EQ(offset.count(), local.tm_gmtoff) << time;
     }
-  }
-}
-
-TEST(StepStrategy, PicksTheIndexWhereFewEntriesAreSelected) {
-  const struct {
-    std::size_t matches, oneIn;  ///< Of so many entries one is selected.
-    std::size_t byIndex;
-  } cases[] = {{0, 1000, 0}, {1, 1000, 20480}, {20, 33, 20480}, {1, 2, 20480},
-               {1, 1, 0},    {20, 5, 0},       {300, 33, 0},    {300, 1000, 18101}};
-  for (const auto& [matches, oneIn, byIndex] : cases) {
-    // Where the index is better, and its matches few, 32 plain steps take turns with 2048 by it.
-    StepStrategy strategy(matches);
-    std::size_t steps = 0;
-    for (std::size_t at = 0; at < std::size_t{10} * (32 + 2048); ++at) {
-      strategy.noteStep(!strategy.isByIndex() && at % oneIn == 0);
-      steps += strategy.isByIndex() ? 1 : 0;
-    }
-    EXPECT_EQ(steps, byIndex) << matches << ", one in " << oneIn;
   }
 }
 
