@@ -5,11 +5,13 @@
 #include "platform/files.h"
 #include "platform/log_store.h"
 #include "platform/system_log.h"
+#include "platform/threads.h"
 #include "platform/work_group.h"
 
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <future>
 #include <memory>
 #include <system_error>
 #include <utility>
@@ -17,6 +19,7 @@
 namespace {
 
 constexpr std::chrono::seconds kLongestExport{180};
+const char* const kTimeout = "Timeout on getting oslog stream";
 constexpr unsigned kReaderFlags =
     kLogReaderStoredOnly | kLogReaderOldestFirst | kLogReaderWholeMessages;
 
@@ -44,6 +47,18 @@ std::unique_ptr<WritableFile> createFile(const std::string& path) {
     logSystemError("Failed to create file: " + path);
   }
   return file;
+}
+
+/// As `createFile`, on a thread of its own, because a file system may never answer; null then.
+std::unique_ptr<WritableFile> createFileInTime(const std::string& path) {
+  const auto created = std::make_shared<std::promise<std::unique_ptr<WritableFile>>>();
+  auto file = created->get_future();
+  startThread("log.file", [created, path] { created->set_value(createFile(path)); }).detach();
+  if (file.wait_for(kLongestExport) == std::future_status::ready) {
+    return file.get();
+  }
+  logSystemError(kTimeout);
+  return nullptr;
 }
 
 WorkGroup createGroup() {
@@ -129,7 +144,7 @@ bool OsLogStream::putOsLogStreamToFile(std::string path, std::vector<std::string
   if (reader == nullptr) {
     return false;
   }
-  auto file = createFile(path);
+  auto file = createFileInTime(path);
   if (file == nullptr) {
     return false;
   }
@@ -156,7 +171,7 @@ bool OsLogStream::putOsLogStreamToFile(std::string path, std::vector<std::string
   if (!ended) {
     *outcome = Outcome::timedOut;
     reader->invalidate();
-    logSystemError("Timeout on getting oslog stream");
+    logSystemError(kTimeout);
   }
   return ended && *outcome == Outcome::complete;
 }
