@@ -9,7 +9,7 @@
 /// What can be typed to complete a line.
 struct Completions {
   std::size_t typed = 0;           ///< Bytes at the end of the line that all `words` begin with.
-  std::vector<std::string> words;  ///< Sorted. A blank goes behind those without a slash at the end.
+  std::vector<std::string> words;  ///< Sorted. A blank goes behind those that end in no slash.
 };
 
 /// Completes a line of which the text up to the cursor is given.

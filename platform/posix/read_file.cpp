@@ -22,7 +22,7 @@ int readRegularFile(const std::filesystem::path& path, std::size_t most, std::st
     return EINVAL;
   }
   text.clear();
-  std::array<char, 4096> piece{};  // What the kernel names the size of need not be what can be read.
+  std::array<char, 4096> piece{};  // The size that a kernel names need not be what can be read.
   ssize_t count = 1;
   while ((count > 0 || (count < 0 && errno == EINTR)) && text.size() < most) {
     count = read(file.get(), piece.data(), std::min(piece.size(), most - text.size()));
