@@ -75,8 +75,7 @@ std::set<std::string> CommandBase::getWords() const {
 }
 
 WordCompleter CommandBase::getWordCompleter(std::string word) const {
-  const auto found = completers.find(word);
-  return found == completers.end() ? nullptr : found->second;
+  return completers.contains(word) ? completers.at(word) : nullptr;
 }
 
 std::string CommandBase::getHierarchy() const {

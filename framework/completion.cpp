@@ -49,10 +49,9 @@ Completions completeLine(const std::shared_ptr<CommandBase>& promptNode, const s
   auto next = Next::firstWord;
   std::set<std::string> known;
   for (auto word = words.begin(); word != words.end() && node; ++word) {
-    if (next == Next::path) {
-      node = nullptr;
-    } else if (*word == "cd") {
+    if (*word == "cd") {
       next = Next::path;
+      node = std::next(word) == words.end() ? node : nullptr;
     } else if (node->isValidCommand(*word)) {
       const auto complete = node->getWordCompleter(*word);
       known = complete ? complete({std::next(word), words.end()}, typed) : known;

@@ -25,5 +25,7 @@ CommandHandler makeBasebandLogsHandler(LogdumpCommand& node);
 /// result is the export's, or false when the first two words are missing.
 CommandHandler makeOsLogHandler();
 
-/// Completes the words of "oslog": files, options, and behind "-p" the names of processes that run.
-WordCompleter makeOsLogCompleter();
+/// The completer of "oslog": offers files, options, and behind "-p" the names of processes that
+/// run.
+std::set<std::string> completeOsLogArgs(const std::list<std::string>& before,
+                                        const std::string& typed);

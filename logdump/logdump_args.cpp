@@ -19,11 +19,6 @@ const std::pair<const char*, std::optional<CompressionMode>> kKeywords[] = {
     {"tar", kCompressionTar},
     {"nonui", std::nullopt}};
 
-auto findKeyword(const std::string& word) {
-  return std::ranges::find_if(
-      kKeywords, [&](const auto& keyword) { return equalNoCase(word, keyword.first); });
-}
-
 }  // namespace
 
 void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::string& reason,
@@ -32,7 +27,8 @@ void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::
   while (!args.empty()) {
     const auto word = std::move(args.front());
     args.pop_front();
-    const auto* const keyword = findKeyword(word);
+    const auto* const keyword = std::ranges::find_if(
+        kKeywords, [&](const auto& known) { return equalNoCase(word, known.first); });
     if (keyword == std::end(kKeywords)) {
       reason = kReasonPrefix + word;
       return;
@@ -45,7 +41,7 @@ void parseLogdumpArgs(std::list<std::string>& args, CompressionMode& mode, std::
 WordCompleter completeLogdumpArgs(bool nonui) {
   return [nonui](const std::list<std::string>& before, const std::string& /*typed*/) {
     std::set<std::string> words{"--"};
-    const bool hasReason = std::ranges::count(before, std::end(kKeywords), findKeyword) > 0;
+    const bool hasReason = readLogdumpOptions(before).reason != readLogdumpOptions({}).reason;
     for (const auto& [word, mode] : kKeywords) {
       if (!hasReason && (nonui || mode)) {
         words.insert(word);

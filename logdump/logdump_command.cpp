@@ -38,7 +38,7 @@ void LogdumpCommand::registerCommands() {
   addCommandHandler("oslog", makeOsLogHandler(),
                     "[history size] [output txt file path] -p <process1 process2..> "
                     "-i <imagePath1 imagePath2..> collect oslog to txt");
-  addWordCompleter("oslog", makeOsLogCompleter());
+  addWordCompleter("oslog", completeOsLogArgs);
 }
 
 bool LogdumpCommand::isAllowed(std::string word) {

@@ -17,8 +17,6 @@
 
 namespace {
 
-namespace fs = std::filesystem;
-
 constexpr std::size_t kFewestWords = 2;
 
 struct Selection {
@@ -79,31 +77,29 @@ std::set<std::string> filesAt(const std::string& typed) {
   const auto folder = typed.substr(0, typed.rfind('/') + 1);
   std::set<std::string> files;
   std::error_code error;
-  for (fs::directory_iterator entry(folder.empty() ? "." : folder, error), end;
+  for (std::filesystem::directory_iterator entry(folder.empty() ? "." : folder, error), end;
        !error && entry != end; entry.increment(error)) {
-    std::error_code unknown;
     files.insert(folder + entry->path().filename().string() +
-                 (entry->is_directory(unknown) ? "/" : ""));
+                 (entry->is_directory(error) ? "/" : ""));
   }
   return files;
 }
 
 }  // namespace
 
-WordCompleter makeOsLogCompleter() {
-  return [](const std::list<std::string>& before, const std::string& typed) {
-    if (before.size() < kFewestWords) {
-      return before.empty() ? std::set<std::string>() : filesAt(typed);
-    }
-    std::string option;
-    for (auto word = std::next(before.begin(), kFewestWords); word != before.end(); ++word) {
-      option = word->starts_with('-') ? *word : option;
-    }
-    if (typed.starts_with('-') || (option != "-p" && option != "-i")) {
-      return std::set<std::string>{"--", "-i", "-p"};
-    }
-    return option == "-p" ? processNames() : filesAt(typed);
-  };
+std::set<std::string> completeOsLogArgs(const std::list<std::string>& before,
+                                        const std::string& typed) {
+  if (before.size() < kFewestWords) {
+    return before.empty() ? std::set<std::string>() : filesAt(typed);
+  }
+  std::string option;
+  for (auto word = std::next(before.begin(), kFewestWords); word != before.end(); ++word) {
+    option = word->starts_with('-') ? *word : option;
+  }
+  if (typed.starts_with('-') || (option != "-p" && option != "-i")) {
+    return {"--", "-i", "-p"};
+  }
+  return option == "-p" ? processNames() : filesAt(typed);
 }
 
 CommandHandler makeOsLogHandler() {
