@@ -76,12 +76,13 @@ bool isPastedTab() {
          (begun ? words.size() != 1 : !words.empty() && words.front()[0] == words.back()[0]);
 }
 
-/// Draws the line. On a screen of one row readline 8.2 divides by a third of its columns, so that
-/// it is told of four columns where there are fewer.
+/// Draws the line. readline 8.2 is told of five columns where there are fewer: on a screen of one
+/// row it divides by a third of them, and on one of four columns it breaks a tab of eight only
+/// once, behind which a row may end before it begins.
 void draw() {
   int columns = 0;
   rl_get_screen_size(nullptr, &columns);
-  rl_set_screen_size(0, columns < 4 ? 4 : 0);  // 0 changes nothing.
+  rl_set_screen_size(0, columns < 5 ? 5 : 0);  // 0 changes nothing.
   rl_redisplay();
 }
 
