@@ -162,7 +162,7 @@ TEST(LineEditing, ShowsWhatIsTyped) {
       {"-- Enter Enter -- Enter '-- --' Enter z Up Up Up Down '|'",
        "--\n(/velltool)>>\n" + kPrompt + "--\n" + kPrompt + "-- --\n" + kPrompt + "-- --|"},
       {"xe\u0301か\u3099漢y Home Right Right Right '|'", "xe\u0301か\u3099|漢y"},
-      {"lo Tab te Tab '|'", "logdump tel |"},
+      {"lo Tab te Tab 'tar x ' Tab '|'", "logdump tel tar x -- |"},
       {"'lo foo' Left Left Left Left Tab '|'", "logdump| foo"},
       {"'tel -- cd logdump/../lo' Tab '|'", "tel -- cd logdump/../logdump/|"},
       {"'logdump ' Tab Tab '|'",
