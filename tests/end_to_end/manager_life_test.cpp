@@ -76,12 +76,14 @@ TEST(ManagerLife, ToolFollowsTheManagerAndTheBus) {
     auto successor = device.serve("manager");
     EXPECT_EQ(successor.readLine(), "OpenClient \"velltool\"");
     expectInTime(tool, kCollected);
+#ifndef VELL_SANITIZED  // A sanitizer takes up to 20 s for such a line.
     if (life == 0) {
       // The bus ends a connection that sends it more than 32 MiB at once.
       EXPECT_EQ(answerTo(tool, "logdump tel " + std::string(33 << 20, 'x')),
                 "Telephony log collection: Failed\n" + kPrompt);
       expectInTime(tool, kCollected);
     }
+#endif
     expectFailure(tool, "logdump bb", successor, "CollectBasebandLogs", bus,
                   "Baseband log collection: Failed\n");
   }
